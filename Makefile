@@ -1,0 +1,47 @@
+# The two commands a new machine needs: `make run` and `make test`.
+# Both install what is missing and build first.
+
+BUILD      ?= build
+ASAN_BUILD ?= build-asan
+JOBS       ?= $(shell nproc)
+CMAKE_ARGS ?=
+
+configure = test -f $(1)/build.ninja || cmake -S . -B $(1) -G Ninja $(2) $(CMAKE_ARGS)
+
+.PHONY: all deps build build-asan test unit-test asan-test fuzz-smoke bench run format clean
+
+all: build
+
+deps:
+	@tools/install-deps.sh
+
+build: deps
+	@$(call configure,$(BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo)
+	cmake --build $(BUILD) -j $(JOBS)
+
+build-asan: deps
+	@$(call configure,$(ASAN_BUILD),-DCMAKE_BUILD_TYPE=Debug -DNORVO_SANITIZE=ON -DNORVO_BENCHMARKS=OFF)
+	cmake --build $(ASAN_BUILD) -j $(JOBS)
+
+# Every test, in the default build and again under AddressSanitizer and
+# UndefinedBehaviorSanitizer.
+test: unit-test asan-test
+
+unit-test: build
+	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
+
+asan-test: build-asan
+	cd $(ASAN_BUILD) && ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
+		ctest --output-on-failure -j $(JOBS)
+
+bench: build
+	cmake --build $(BUILD) --target bench
+
+run: build
+	$(BUILD)/tools/decode/norvo-decode --demo
+
+format:
+	git ls-files '*.h' '*.cc' | xargs clang-format -i
+
+clean:
+	rm -rf $(BUILD) $(ASAN_BUILD)

@@ -1,0 +1,21 @@
+# norvo_add_test(<name> SOURCES <files...> LIBS <targets...>)
+# Builds one GoogleTest binary and registers its tests with CTest.
+function(norvo_add_test name)
+  cmake_parse_arguments(ARG "" "" "SOURCES;LIBS" ${ARGN})
+  add_executable(${name} ${ARG_SOURCES})
+  target_link_libraries(${name} PRIVATE ${ARG_LIBS} GTest::gtest GTest::gmock GTest::gtest_main)
+  gtest_discover_tests(${name} DISCOVERY_TIMEOUT 60)
+endfunction()
+include(GoogleTest)
+
+# norvo_add_benchmark(<name> SOURCES <files...> LIBS <targets...>)
+# Builds one Google Benchmark binary; `make bench` runs them all.
+function(norvo_add_benchmark name)
+  cmake_parse_arguments(ARG "" "" "SOURCES;LIBS" ${ARGN})
+  if(NOT NORVO_BENCHMARKS)
+    return()
+  endif()
+  add_executable(${name} ${ARG_SOURCES})
+  target_link_libraries(${name} PRIVATE ${ARG_LIBS} benchmark::benchmark)
+  set_property(GLOBAL APPEND PROPERTY NORVO_BENCHMARK_TARGETS ${name})
+endfunction()

@@ -1,0 +1,107 @@
+#include "platform/Log.h"
+
+#include <syslog.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <climits>
+#include <cstdio>
+#include <mutex>
+
+namespace platform::log {
+
+namespace {
+
+struct Channels {
+  std::mutex mutex;
+  std::vector<Capture*> captures;  // the innermost last
+  bool systemLogOpen = false;
+
+  static Channels& instance() {
+    // Never destroyed, so that lines written while other static objects are destroyed
+    // still find it.
+    static Channels* const channels = new Channels;
+    return *channels;
+  }
+};
+
+void writeToStandardOutput(std::string_view line) {
+  // A terminal shows each line at once; a pipe or file keeps stdio's buffering, which exit()
+  // flushes.
+  static const bool interactive = isatty(STDOUT_FILENO) == 1;
+  // Holding the stream keeps the line whole even next to other writers of standard output.
+  flockfile(stdout);
+  std::fwrite(line.data(), 1, line.size(), stdout);
+  std::fputc('\n', stdout);
+  if (interactive) std::fflush(stdout);
+  funlockfile(stdout);
+}
+
+void writeToSystemLog(Channels& channels, std::string_view line) {
+  if (!channels.systemLogOpen) {
+    openlog("norvo", LOG_PID, LOG_USER);
+    channels.systemLogOpen = true;
+  }
+  const int length = static_cast<int>(std::min<std::size_t>(line.size(), INT_MAX));
+  syslog(LOG_NOTICE, "%.*s", length, line.data());
+}
+
+}  // namespace
+
+void plain(std::string_view line) {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (channels.captures.empty()) {
+    writeToStandardOutput(line);
+  } else {
+    channels.captures.back()->plainLines_.emplace_back(line);
+  }
+}
+
+void system(std::string_view line) {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (channels.captures.empty()) {
+    writeToSystemLog(channels, line);
+  } else {
+    channels.captures.back()->systemLines_.emplace_back(line);
+  }
+}
+
+Capture::Capture() {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  channels.captures.push_back(this);
+}
+
+Capture::~Capture() {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  std::erase(channels.captures, this);
+}
+
+std::vector<std::string> Capture::plainLines() const {
+  const std::lock_guard lock(Channels::instance().mutex);
+  return plainLines_;
+}
+
+std::vector<std::string> Capture::systemLines() const {
+  const std::lock_guard lock(Channels::instance().mutex);
+  return systemLines_;
+}
+
+std::size_t Capture::count(std::string_view line) const {
+  const std::lock_guard lock(Channels::instance().mutex);
+  const auto countIn = [line](const std::vector<std::string>& lines) {
+    return static_cast<std::size_t>(std::count(lines.begin(), lines.end(), line));
+  };
+  return countIn(plainLines_) + countIn(systemLines_);
+}
+
+void Capture::clear() {
+  const std::lock_guard lock(Channels::instance().mutex);
+  plainLines_.clear();
+  systemLines_.clear();
+}
+
+}  // namespace platform::log

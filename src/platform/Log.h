@@ -1,0 +1,50 @@
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/Format.h"
+
+// The two diagnostic channels: the plain log on standard output and the system log. Lines may
+// come from any thread; each is written whole, with a trailing newline.
+namespace platform::log {
+
+void plain(std::string_view line);
+void system(std::string_view line);
+
+template <class... Args>
+void plainf(std::string_view pattern, const Args&... arguments) {
+  plain(format(pattern, arguments...));
+}
+
+template <class... Args>
+void systemf(std::string_view pattern, const Args&... arguments) {
+  system(format(pattern, arguments...));
+}
+
+// While a Capture is alive, the lines of both channels go to it instead of to standard output
+// and the system log. Captures nest: the most recent one alive receives the lines.
+class Capture {
+ public:
+  Capture();
+  ~Capture();
+  Capture(const Capture&) = delete;
+  Capture& operator=(const Capture&) = delete;
+
+  std::vector<std::string> plainLines() const;
+  std::vector<std::string> systemLines() const;
+  // How often the exact line was written, to either channel.
+  std::size_t count(std::string_view line) const;
+  void clear();
+
+ private:
+  friend void plain(std::string_view line);
+  friend void system(std::string_view line);
+
+  std::vector<std::string> plainLines_;
+  std::vector<std::string> systemLines_;
+};
+
+}  // namespace platform::log

@@ -1,0 +1,213 @@
+#include "platform/Value.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <limits>
+#include <ostream>
+
+namespace platform {
+
+// Failure messages show values in their text form.
+void PrintTo(const Value& value, std::ostream* out) {
+  *out << value.description();
+}
+void PrintTo(const Dictionary& dictionary, std::ostream* out) {
+  *out << dictionary.description();
+}
+
+namespace {
+
+using Kind = Value::Kind;
+
+TEST(AValue, TakesTheKindOfTheArgumentsOwnType) {
+  EXPECT_EQ(Value("x").kind(), Kind::String);
+  EXPECT_EQ(Value(true).kind(), Kind::Bool);
+  EXPECT_EQ(Value(5).kind(), Kind::Int32);
+  EXPECT_EQ(Value(5u).kind(), Kind::UInt32);
+  EXPECT_EQ(Value(5L).kind(), Kind::Int64);
+  EXPECT_EQ(Value(5LL).kind(), Kind::Int64);
+  EXPECT_EQ(Value(5ULL).kind(), Kind::UInt64);
+  EXPECT_EQ(Value(std::int16_t{5}).kind(), Kind::Int32);
+  EXPECT_EQ(Value(std::uint8_t{5}).kind(), Kind::UInt32);
+  EXPECT_EQ(Value(5.0f).kind(), Kind::Float);
+  EXPECT_EQ(Value(5.0).kind(), Kind::Double);
+  EXPECT_EQ(Value(std::string_view("x")).kind(), Kind::String);
+  char buffer[] = "x";
+  EXPECT_EQ(Value(buffer).kind(), Kind::String);
+  EXPECT_EQ(Value(static_cast<char*>(buffer)).kind(), Kind::String);
+  EXPECT_EQ(Value(Bytes{1}).kind(), Kind::Bytes);
+  EXPECT_EQ(Value(List{}).kind(), Kind::List);
+  EXPECT_EQ(Value(Dictionary{}).kind(), Kind::Dictionary);
+}
+
+TEST(AValue, IsNullWhenAbsentOrMadeFromANullPointer) {
+  EXPECT_TRUE(Value().isNull());
+  EXPECT_TRUE(Value(nullptr).isNull());
+  EXPECT_TRUE(Value(static_cast<const char*>(nullptr)).isNull());
+}
+
+TEST(AValue, CountsBooleansAsNumbersButNotTextOrContainers) {
+  EXPECT_TRUE(Value(false).isNumber());
+  EXPECT_TRUE(Value(1.5).isNumber());
+  EXPECT_FALSE(Value("1").isNumber());
+  EXPECT_FALSE(Value(List{1}).isNumber());
+  EXPECT_FALSE(Value().isNumber());
+}
+
+TEST(AValue, ReadsAsAnIntegerOnlyWhenTheNumberIsExactlyOne) {
+  EXPECT_EQ(Value(true).asInteger(), 1);
+  EXPECT_EQ(Value(-7).asInteger(), -7);
+  EXPECT_EQ(Value(5.0).asInteger(), 5);
+  EXPECT_EQ(Value(-0x1p63).asInteger(), std::numeric_limits<std::int64_t>::min());
+  EXPECT_EQ(Value(std::uint64_t{1} << 63).asInteger(), std::nullopt);
+  EXPECT_EQ(Value(0x1p63).asInteger(), std::nullopt);
+  EXPECT_EQ(Value(5.5).asInteger(), std::nullopt);
+  EXPECT_EQ(Value(std::nan("")).asInteger(), std::nullopt);
+  EXPECT_EQ(Value(INFINITY).asInteger(), std::nullopt);
+  EXPECT_EQ(Value("5").asInteger(), std::nullopt);
+  EXPECT_EQ(Value().asInteger(), std::nullopt);
+}
+
+TEST(AValue, ReadsAsAnInt32OnlyWithinItsRange) {
+  EXPECT_EQ(Value(std::int64_t{-2147483648}).asInt32(), -2147483647 - 1);
+  EXPECT_EQ(Value(std::int64_t{2147483648}).asInt32(), std::nullopt);
+  EXPECT_EQ(Value(std::uint32_t{4294967295}).asInt32(), std::nullopt);
+  EXPECT_EQ(Value(2147483647.0).asInt32(), 2147483647);
+  EXPECT_EQ(Value(2147483648.0f).asInt32(), std::nullopt);
+}
+
+TEST(AValue, ReadsAsAFloatOnlyWhenTheFloatHoldsTheValueExactly) {
+  EXPECT_EQ(Value(3).asFloat(), 3.0f);
+  EXPECT_EQ(Value(-10.5).asFloat(), -10.5f);
+  EXPECT_EQ(Value(0.1).asFloat(), std::nullopt);
+  EXPECT_EQ(Value(16777217).asFloat(), std::nullopt);
+  EXPECT_EQ(Value(1e300).asFloat(), std::nullopt);
+  EXPECT_EQ(Value(std::numeric_limits<std::int64_t>::max()).asFloat(), std::nullopt);
+  EXPECT_EQ(Value(-INFINITY).asFloat(), -INFINITY);
+  EXPECT_TRUE(std::isnan(*Value(std::nan("")).asFloat()));
+}
+
+TEST(AValue, ReadsAsADoubleOnlyWhenTheDoubleHoldsTheValueExactly) {
+  EXPECT_EQ(Value(0.1f).asDouble(), static_cast<double>(0.1f));
+  EXPECT_EQ(Value(std::int64_t{1} << 53).asDouble(), 9007199254740992.0);
+  EXPECT_EQ(Value((std::int64_t{1} << 53) + 1).asDouble(), std::nullopt);
+  EXPECT_EQ(Value(std::numeric_limits<std::uint64_t>::max()).asDouble(), std::nullopt);
+  EXPECT_EQ(Value(false).asDouble(), 0.0);
+}
+
+TEST(AValue, HandsOutItsContentsOnlyForTheirOwnKind) {
+  EXPECT_EQ(*Value("x").asString(), "x");
+  EXPECT_EQ(Value(1).asString(), nullptr);
+  EXPECT_EQ(*Value(Bytes{1, 2}).asBytes(), (Bytes{1, 2}));
+  EXPECT_EQ(Value("x").asList(), nullptr);
+  EXPECT_EQ(Value(List{}).asDictionary(), nullptr);
+
+  Value list(List{1});
+  list.asList()->push_back(2);
+  EXPECT_EQ(list, Value(List{1, 2}));
+}
+
+TEST(AValue, EqualsOnlyAValueOfTheSameKindAndValue) {
+  EXPECT_EQ(Value(1), Value(1));
+  EXPECT_NE(Value(1), Value(std::int64_t{1}));
+  EXPECT_NE(Value(1), Value(true));
+  EXPECT_NE(Value(1.0f), Value(1.0));
+  EXPECT_EQ(Value(), Value());
+  EXPECT_NE(Value(), Value(""));
+  EXPECT_NE(Value(List{1, 2}), Value(List{2, 1}));
+}
+
+TEST(AValue, CompareDictionariesWhateverTheirOrder) {
+  const Dictionary forward{{"a", 1}, {"b", List{Dictionary{{"x", "y"}, {"z", 2}}}}};
+  const Dictionary backward{{"b", List{Dictionary{{"z", 2}, {"x", "y"}}}}, {"a", 1}};
+  EXPECT_EQ(Value(forward), Value(backward));
+  EXPECT_NE(forward, (Dictionary{{"a", 1}}));
+  EXPECT_NE((Dictionary{{"a", 1}}), (Dictionary{{"b", 1}}));
+  EXPECT_NE((Dictionary{{"a", 1}}), (Dictionary{{"a", 2}}));
+}
+
+TEST(ADictionary, KeepsTheOrderOfInsertionWhenValuesAreReplacedOrRemoved) {
+  Dictionary dictionary;
+  dictionary.set("c", 1);
+  dictionary.append("a", 2);
+  dictionary.set("b", 3);
+  dictionary.set("c", "replaced");
+  EXPECT_TRUE(dictionary.erase("a"));
+  EXPECT_FALSE(dictionary.erase("a"));
+  dictionary.set("a", 4);
+
+  std::vector<std::string> keys;
+  for (const auto& [key, value] : dictionary)
+    keys.push_back(key);
+  EXPECT_EQ(keys, (std::vector<std::string>{"c", "b", "a"}));
+  EXPECT_EQ(*dictionary.find("c"), Value("replaced"));
+  EXPECT_EQ(dictionary.size(), 3u);
+}
+
+TEST(ADictionary, LetsAFoundValueBeChangedInPlace) {
+  Dictionary dictionary{{"rsrp", 40}};
+  *dictionary.find("rsrp") = 40 - 140;
+  EXPECT_EQ(dictionary, (Dictionary{{"rsrp", -100}}));
+  EXPECT_EQ(dictionary.find("rsrq"), nullptr);
+  EXPECT_FALSE(dictionary.contains("rsrq"));
+}
+
+TEST(ADictionary, TakesTheLastOfRepeatedKeysInAnInitializerList) {
+  const Dictionary dictionary{{"a", 1}, {"b", 2}, {"a", 3}};
+  EXPECT_EQ(dictionary.size(), 2u);
+  EXPECT_EQ(*dictionary.find("a"), Value(3));
+  EXPECT_EQ(dictionary.begin()->first, "a");
+}
+
+TEST(AValueDescription, WritesTextAloneWithoutQuotesButQuotesItInsideContainers) {
+  EXPECT_EQ(Value("say \"hi\"").description(), "say \"hi\"");
+  EXPECT_EQ(Value(List{"a\"b", "c\\d"}).description(), R"(["a\"b", "c\\d"])");
+  EXPECT_EQ(Value(Dictionary{{"k\"", "v"}}).description(), R"(["k\"": "v"])");
+}
+
+TEST(AValueDescription, WritesListsAndDictionariesInBracketsInTheirOwnOrder) {
+  EXPECT_EQ(Value(List{1, 3, 7}).description(), "[1, 3, 7]");
+  EXPECT_EQ(Value(List{}).description(), "[]");
+  EXPECT_EQ(Value(Dictionary{}).description(), "[:]");
+  EXPECT_EQ(Value(Dictionary{{"b", 1}, {"a", "x"}}).description(), R"(["b": 1, "a": "x"])");
+  EXPECT_EQ(Value(Dictionary{{"l", List{Dictionary{}, List{}}}, {"d", Dictionary{{"n", Value()}}}})
+                .description(),
+            R"(["l": [[:], []], "d": ["n": (null)]])");
+}
+
+TEST(AValueDescription, WritesIntegersInDecimalAndBooleansAsDigits) {
+  EXPECT_EQ(Value(-42).description(), "-42");
+  EXPECT_EQ(Value(std::numeric_limits<std::int64_t>::min()).description(), "-9223372036854775808");
+  EXPECT_EQ(Value(std::numeric_limits<std::uint64_t>::max()).description(), "18446744073709551615");
+  EXPECT_EQ(Value(List{true, false}).description(), "[1, 0]");
+}
+
+TEST(AValueDescription, PrintsFloatsInTheirShortestFormWithAFractionalPart) {
+  EXPECT_EQ(Value(5.0).description(), "5.0");
+  EXPECT_EQ(Value(-11.75).description(), "-11.75");
+  EXPECT_EQ(Value(1.4f).description(), "1.4");
+  EXPECT_EQ(Value(0.1).description(), "0.1");
+  EXPECT_EQ(Value(-0.0).description(), "-0.0");
+  EXPECT_EQ(Value(1e20).description(), "1e+20");
+  EXPECT_EQ(Value(INFINITY).description(), "inf");
+  EXPECT_EQ(Value(-INFINITY).description(), "-inf");
+  EXPECT_EQ(Value(-std::nan("")).description(), "nan");
+}
+
+TEST(AValueDescription, WritesBytesInGroupsOfFourInHexadecimal) {
+  EXPECT_EQ(Value(Bytes{0x0a, 0x1b, 0x2c, 0x3d, 0x4e}).description(), "<0a1b2c3d 4e>");
+  EXPECT_EQ(Value(Bytes{0xff, 0, 0, 1}).description(), "<ff000001>");
+  EXPECT_EQ(Value(Bytes{}).description(), "<>");
+}
+
+TEST(AValueDescription, IsTheSameForAContainerAloneAndInsideAValue) {
+  const List list{"a", 1};
+  const Dictionary dictionary{{"a", list}};
+  EXPECT_EQ(description(list), Value(list).description());
+  EXPECT_EQ(dictionary.description(), Value(dictionary).description());
+}
+
+}  // namespace
+}  // namespace platform

@@ -1,0 +1,24 @@
+#pragma once
+
+#include <memory>
+#include <span>
+#include <string_view>
+
+#include "codec/Codable.h"
+
+namespace messages {
+
+// What the program knows of one record class without naming it in code.
+struct RecordClass {
+  std::string_view name;
+  std::shared_ptr<codec::Codable> (*create)();
+  // False for the records that decode field numbers in full and apply no
+  // metric-ID tag rule.
+  bool appliesMetricIdTagRule;
+};
+
+// Every record class, in schema order.
+std::span<const RecordClass> recordClasses();
+const RecordClass* recordClassNamed(std::string_view name);
+
+}  // namespace messages

@@ -38,7 +38,7 @@ bench: build
 	cmake --build $(BUILD) --target bench
 
 run: build
-	$(BUILD)/tools/decode/norvo-decode --demo
+	$(BUILD)/tools/decode/norvo-decode KCellularLteRrcState 0880b0def7d32b1003180120ee282804
 
 format:
 	git ls-files '*.h' '*.cc' | xargs clang-format -i

@@ -80,8 +80,7 @@ void appendValue(std::string& out, const Value& value) {
       appendString(out, stored);
     } else if constexpr (std::is_same_v<Stored, Bytes>) {
       out += '"';
-      for (std::uint8_t byte : stored)
-        appendHexByte(out, byte);
+      appendHex(out, stored.data(), stored.size(), 0);
       out += '"';
     } else if constexpr (std::is_same_v<Stored, List>) {
       appendList(out, stored);

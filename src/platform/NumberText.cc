@@ -28,10 +28,25 @@ void appendShortestFloat(std::string& out, double value) {
   appendShortest(out, value);
 }
 
+namespace {
+constexpr char kHexDigits[] = "0123456789abcdef";
+}  // namespace
+
 void appendHexByte(std::string& out, unsigned char byte) {
-  static constexpr char kDigits[] = "0123456789abcdef";
-  out += kDigits[byte >> 4];
-  out += kDigits[byte & 0xF];
+  out += kHexDigits[byte >> 4];
+  out += kHexDigits[byte & 0xF];
+}
+
+void appendHex(std::string& out, const std::uint8_t* bytes, std::size_t size, std::size_t group) {
+  if (size == 0) return;
+  const std::size_t spaces = group == 0 ? 0 : (size - 1) / group;
+  std::size_t at = out.size();
+  out.resize(at + 2 * size + spaces);
+  for (std::size_t i = 0; i < size; ++i) {
+    if (group != 0 && i > 0 && i % group == 0) out[at++] = ' ';
+    out[at++] = kHexDigits[bytes[i] >> 4];
+    out[at++] = kHexDigits[bytes[i] & 0xF];
+  }
 }
 
 }  // namespace platform

@@ -2,6 +2,8 @@
 
 #include <charconv>
 #include <concepts>
+#include <cstddef>
+#include <cstdint>
 #include <string>
 
 namespace platform {
@@ -21,5 +23,10 @@ void appendShortestFloat(std::string& out, double value);
 
 // Two lowercase hexadecimal digits.
 void appendHexByte(std::string& out, unsigned char byte);
+
+// Lowercase hexadecimal digits of a byte run, with a space after every
+// `group` bytes when `group` is not 0. Sized once: payloads can be long and
+// are written into every metric's log line.
+void appendHex(std::string& out, const std::uint8_t* bytes, std::size_t size, std::size_t group);
 
 }  // namespace platform

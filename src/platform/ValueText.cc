@@ -21,10 +21,7 @@ void appendQuoted(std::string& out, std::string_view text) {
 
 void appendBytes(std::string& out, const Bytes& bytes) {
   out += '<';
-  for (std::size_t i = 0; i < bytes.size(); ++i) {
-    if (i > 0 && i % 4 == 0) out += ' ';
-    appendHexByte(out, bytes[i]);
-  }
+  appendHex(out, bytes.data(), bytes.size(), 4);
   out += '>';
 }
 

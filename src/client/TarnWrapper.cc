@@ -1,0 +1,143 @@
+#include "client/TarnWrapper.h"
+
+#include <fstream>
+#include <iterator>
+#include <string>
+
+#include "platform/Log.h"
+#include "platform/MainQueue.h"
+#include "platform/Once.h"
+#include "tarn/Names.h"
+
+namespace {
+
+using tarn::ipc::Object;
+
+constexpr std::string_view kClientName = "vexmora";
+constexpr std::string_view kAppIdText = "vexmora";
+constexpr std::int64_t kAppId = 2;
+constexpr std::int64_t kPayloadType = 0;
+constexpr const char* kQueueLabel = "org.norvo.viewer.serialQ.queue";
+// What a command result holds before the library has answered.
+constexpr std::int32_t kNotPerformed = static_cast<std::int32_t>(0xE020E002);
+
+constexpr const char* kAddName = "-[TarnWrapper addVelaConfigForAppId:andProtofFilePath:]";
+constexpr const char* kRemoveName = "-[TarnWrapper removeVelaConfigForAppid:]";
+constexpr const char* kQueryName =
+    "-[TarnWrapper querySpecificMetric:triggerRef:triggerType:triggerID:profileID:metricID:]";
+constexpr const char* kListenName = "-[TarnWrapper listen]";
+constexpr const char* kHandlerName = "-[TarnWrapper listen]_block_invoke";
+
+// The events that listen() registers for, and where each goes.
+struct Listener {
+  std::string_view event;
+  const char* logFormat;
+  void (TarnWrapperDelegate::*operation)(const platform::Dictionary&);
+};
+
+constexpr Listener kListeners[] = {
+    {tarn::kEventTrigger, "%s: EventTrigger dict=%@", &TarnWrapperDelegate::eventsDidUpdate},
+    {tarn::kEventMetric, "%s: MetricsTrigger dict=%@", &TarnWrapperDelegate::metricsDidUpdate},
+};
+
+// The whole file, or nothing when it cannot be read.
+platform::Bytes readWholeFile(std::string_view path) {
+  std::ifstream file{std::string(path), std::ios::binary};
+  return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+}
+
+Object::Entry entry(std::string_view key, Object value) {
+  return {std::string(key), std::move(value)};
+}
+
+}  // namespace
+
+TarnWrapper& TarnWrapper::sharedInstance() {
+  static TarnWrapper* const instance = new TarnWrapper;
+  return *instance;
+}
+
+TarnWrapper::TarnWrapper() : delegate_(std::make_shared<DelegateSlot>()) {
+  tarnManager_ = tarn::client::CreateManager(std::string(kClientName), queue());
+}
+
+TarnWrapper::~TarnWrapper() {
+  delegate_->store({});
+}
+
+platform::SerialQueue TarnWrapper::queue() {
+  // One queue for the process: every wrapper's session delivers on it.
+  static platform::Once once;
+  static platform::SerialQueue* shared = nullptr;
+  once([] { shared = new platform::SerialQueue(kQueueLabel); });
+  if (!queue_) queue_ = *shared;
+  return *queue_;
+}
+
+bool TarnWrapper::addVelaConfigForAppId(std::string_view appId, std::string_view path) {
+  if (appId != kAppIdText) return false;
+  Object payload = Object::bytes(readWholeFile(path));
+  if (payload.isNull()) return false;
+  return perform(kAddName, tarn::kCommandAddConfiguration,
+                 {entry(tarn::kKeyAppID, Object::integer(kAppId)),
+                  entry(tarn::kKeyPayload, std::move(payload)),
+                  entry(tarn::kKeyPayloadType, Object::integer(kPayloadType))});
+}
+
+bool TarnWrapper::removeVelaConfigForAppid(std::string_view appId) {
+  if (appId != kAppIdText) return false;
+  return perform(kRemoveName, tarn::kCommandClearConfiguration,
+                 {entry(tarn::kKeyAppID, Object::integer(kAppId))});
+}
+
+bool TarnWrapper::querySpecificMetric(std::string_view appId, std::int32_t triggerRef,
+                                      std::int32_t triggerType, std::int32_t triggerID,
+                                      std::int32_t profileID, std::int32_t metricID) {
+  if (appId != kAppIdText) return false;
+  return perform(kQueryName, tarn::kCommandQueryMetric,
+                 {entry(tarn::kKeyAppID, Object::integer(kAppId)),
+                  entry(tarn::kKeyPayloadType, Object::integer(kPayloadType)),
+                  entry(tarn::kKeyTriggerRef, Object::integer(triggerRef)),
+                  entry(tarn::kKeyTriggerType, Object::integer(triggerType)),
+                  entry(tarn::kKeyTriggerID, Object::integer(triggerID)),
+                  entry(tarn::kKeyProfileID, Object::integer(profileID)),
+                  entry(tarn::kKeyMetricID, Object::integer(metricID))});
+}
+
+bool TarnWrapper::perform(const char* logName, std::string_view command, Object::Entries entries) {
+  tarn::client::CommandResult result{kNotPerformed, {}};
+  const Object input = Object::dictionary(std::move(entries));
+  Object output;
+  result = tarn::client::PerformCommand(tarnManager_, std::string(command), input, output);
+  platform::log::systemf("%s: error=%d msg=%s", logName, result.status, result.message);
+  return result.status == 0;
+}
+
+void TarnWrapper::listen() {
+  for (const Listener& listener : kListeners) {
+    tarn::client::RegisterEventHandler(
+        tarnManager_, std::string(listener.event),
+        [delegate = delegate_, listener](const Object& object, tarn::client::CompletionGroup) {
+          platform::Value plain = tarn::ipc::toPlainDictionary(object);
+          platform::log::systemf(listener.logFormat, kHandlerName, plain);
+          // The delegate operations take dictionaries; anything else is only logged.
+          if (delegate->load().expired() || !plain.isDictionary()) return;
+          // The task holds the delegate slot rather than the wrapper, which may be gone by then.
+          platform::postToMainQueue([delegate, operation = listener.operation,
+                                     dictionary = std::move(*plain.asDictionary())] {
+            if (const auto receiver = delegate->load().lock()) ((*receiver).*operation)(dictionary);
+          });
+        });
+  }
+  tarn::client::EventsOff(tarnManager_);
+  tarn::client::EventsOn(tarnManager_);
+  platform::log::systemf("%s: listening for events", kListenName);
+}
+
+std::weak_ptr<TarnWrapperDelegate> TarnWrapper::delegate() const {
+  return delegate_->load();
+}
+
+void TarnWrapper::setDelegate(std::weak_ptr<TarnWrapperDelegate> delegate) {
+  delegate_->store(std::move(delegate));
+}

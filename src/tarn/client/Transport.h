@@ -1,0 +1,41 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "tarn/CommandResult.h"
+#include "tarn/Ipc.h"
+
+// How sessions reach the baseband manager service. A transport opens connections; the client
+// library's Manager talks to one connection and never to the service itself.
+namespace tarn::client {
+
+// Receives the events of one connection: the event's name and its object. The transport calls it
+// from its own threads, one call at a time, in the order the service sent the events.
+using EventSink = std::function<void(std::string_view event, ipc::Object object)>;
+
+// One open session with the service. Destroying it closes the session: no sink call runs after
+// the destructor has returned.
+class Connection {
+ public:
+  virtual ~Connection() = default;
+  virtual CommandResult perform(std::string_view command, const ipc::Object& input,
+                                ipc::Object& output) = 0;
+  virtual void setEventsOn(bool on) = 0;
+};
+
+class Transport {
+ public:
+  virtual ~Transport() = default;
+  // Empty when the service cannot be reached.
+  virtual std::unique_ptr<Connection> connect(const std::string& clientName, EventSink sink) = 0;
+};
+
+// Chooses the transport of the sessions created from now on; sessions already open keep theirs.
+// Until a process chooses, sessions reach a service that runs inside the process and reports no
+// metrics.
+void useTransport(std::shared_ptr<Transport> transport);
+
+}  // namespace tarn::client

@@ -1,0 +1,190 @@
+#include "tarn/service/Core.h"
+
+#include <algorithm>
+
+#include "platform/Format.h"
+#include "tarn/Names.h"
+#include "tarn/service/Arguments.h"
+
+namespace tarn::service {
+
+namespace {
+
+// The only payload type: configuration text.
+constexpr std::int64_t kConfigurationText = 0;
+
+// On-demand triggers ask for the metric with the same tag: trigger 0x7Fxxxx for metric 0x3Cxxxx.
+constexpr std::int64_t kOnDemandTriggers = 0x7F0000;
+constexpr std::uint32_t kMetrics = 0x3C0000;
+constexpr std::int64_t kTagMask = 0xFFFF;
+
+std::uint32_t metricIdOf(std::int64_t value) {
+  if (value <= 0 || value > 0xFFFFFFFF) {
+    throw Refusal{status::kInvalidArgument,
+                  platform::format("metric ID %lld is out of range (0x1 to 0xFFFFFFFF)", value)};
+  }
+  return static_cast<std::uint32_t>(value);
+}
+
+std::uint32_t metricIdOfTrigger(std::int64_t triggerId) {
+  if ((triggerId & ~kTagMask) != kOnDemandTriggers) {
+    throw Refusal{status::kInvalidArgument,
+                  platform::format("trigger ID 0x%llX asks for no metric; on-demand triggers run "
+                                   "from 0x7F0000 to 0x7FFFFF",
+                                   triggerId)};
+  }
+  return kMetrics | static_cast<std::uint32_t>(triggerId & kTagMask);
+}
+
+ipc::Object metricRecord(const Metric& metric, std::int64_t profileId, std::int64_t appId) {
+  return ipc::Object::dictionary({
+      {std::string(kKeyMetricID), ipc::Object::integer(metric.metricId)},
+      {std::string(kKeyPayload), ipc::Object::bytes(metric.payload)},
+      {std::string(kKeyProfileID), ipc::Object::integer(profileId)},
+      {std::string(kKeyAppID), ipc::Object::integer(appId)},
+  });
+}
+
+}  // namespace
+
+Core::Core(std::shared_ptr<MetricSource> source, std::vector<App> apps)
+    : apps_(std::move(apps)), source_(std::move(source)) {
+  if (source_) source_->start([this](Metric metric) { deliver(metric); });
+}
+
+Core::~Core() {
+  if (source_) source_->stop();
+}
+
+Core::SessionId Core::openSession(const std::string& clientName, EventSink sink) {
+  const auto app = std::find_if(apps_.begin(), apps_.end(), [&clientName](const App& candidate) {
+    return candidate.clientName == clientName;
+  });
+  Session session{.appId = app != apps_.end() ? std::optional(app->id) : std::nullopt,
+                  .sink = std::move(sink)};
+  const std::lock_guard lock(mutex_);
+  const SessionId id = ++lastSession_;
+  sessions_.emplace(id, std::move(session));
+  return id;
+}
+
+void Core::closeSession(SessionId session) {
+  EventSink closing;
+  {
+    const std::lock_guard lock(mutex_);
+    const auto found = sessions_.find(session);
+    if (found == sessions_.end()) return;
+    closing = std::move(found->second.sink);
+    sessions_.erase(found);
+  }
+  // The sink is released outside the lock: what it holds may be the last reference to a client.
+}
+
+void Core::setEventsOn(SessionId session, bool on) {
+  const std::lock_guard lock(mutex_);
+  const auto found = sessions_.find(session);
+  if (found != sessions_.end()) found->second.eventsOn = on;
+}
+
+const std::unordered_map<std::string_view, Core::Command>& Core::commands() {
+  static const std::unordered_map<std::string_view, Command> table = {
+      {kCommandAddConfiguration, &Core::addConfiguration},
+      {kCommandClearConfiguration, &Core::clearConfiguration},
+      {kCommandQueryMetric, &Core::queryMetric},
+  };
+  return table;
+}
+
+CommandResult Core::perform(std::string_view command, const ipc::Object& input) {
+  const auto found = commands().find(command);
+  if (found == commands().end()) {
+    return {status::kUnknownCommand, platform::format("unknown command '%s'", command)};
+  }
+  try {
+    (this->*found->second)(Arguments(input));
+    return {};
+  } catch (const Refusal& refusal) {
+    return {refusal.status, refusal.message};
+  }
+}
+
+std::int64_t Core::knownAppId(const Arguments& arguments) const {
+  const std::int64_t appId = arguments.integer(kKeyAppID);
+  const bool known =
+      std::any_of(apps_.begin(), apps_.end(), [appId](const App& app) { return app.id == appId; });
+  if (!known) throw Refusal{status::kUnknownAppId, platform::format("unknown app ID %lld", appId)};
+  return appId;
+}
+
+void Core::addConfiguration(const Arguments& arguments) {
+  const std::int64_t appId = knownAppId(arguments);
+  const std::int64_t payloadType = arguments.integer(kKeyPayloadType, kConfigurationText);
+  if (payloadType != kConfigurationText) {
+    throw Refusal{status::kInvalidArgument,
+                  platform::format("unsupported payload type %lld", payloadType)};
+  }
+  const platform::Bytes& payload = arguments.bytes(kKeyPayload);
+  try {
+    Configuration configuration = Configuration::parse(
+        std::string_view(reinterpret_cast<const char*>(payload.data()), payload.size()));
+    const std::lock_guard lock(mutex_);
+    configurations_.insert_or_assign(appId, std::move(configuration));
+  } catch (const ConfigurationError& error) {
+    throw Refusal{status::kMalformedConfiguration,
+                  platform::format("malformed configuration: %s", error.what())};
+  }
+}
+
+void Core::clearConfiguration(const Arguments& arguments) {
+  const std::int64_t appId = knownAppId(arguments);
+  const std::lock_guard lock(mutex_);
+  configurations_.erase(appId);
+}
+
+void Core::queryMetric(const Arguments& arguments) {
+  const std::int64_t appId = knownAppId(arguments);
+  const std::int64_t triggerId = arguments.integer(kKeyTriggerID);
+  const std::int64_t metricArgument = arguments.integer(kKeyMetricID, 0);
+  const std::int64_t profileId = arguments.integer(kKeyProfileID, 0);
+  const std::uint32_t metricId =
+      metricArgument != 0 ? metricIdOf(metricArgument) : metricIdOfTrigger(triggerId);
+
+  // Asked without the lock: the source may be delivering, and delivery takes the lock.
+  const std::optional<Metric> answer = source_ ? source_->query(metricId) : std::nullopt;
+  if (!answer) {
+    throw Refusal{status::kNoSuchMetric,
+                  platform::format("the baseband has no metric 0x%X to report", metricId)};
+  }
+  ipc::Object trigger = ipc::Object::dictionary({
+      {std::string(kKeyAppID), ipc::Object::integer(appId)},
+      {std::string(kKeyTriggerRef), ipc::Object::integer(arguments.integer(kKeyTriggerRef, 0))},
+      {std::string(kKeyTriggerType), ipc::Object::integer(arguments.integer(kKeyTriggerType, 0))},
+      {std::string(kKeyTriggerID), ipc::Object::integer(triggerId)},
+      {std::string(kKeyProfileID), ipc::Object::integer(profileId)},
+  });
+  const std::lock_guard lock(mutex_);
+  sendToApp(appId, kEventTrigger, std::move(trigger));
+  sendToApp(appId, kEventMetric, metricRecord(*answer, profileId, appId));
+}
+
+void Core::deliver(const Metric& metric) {
+  const std::lock_guard lock(mutex_);
+  for (const auto& [appId, configuration] : configurations_) {
+    if (const std::optional<std::int64_t> profileId = configuration.profileOf(metric.metricId)) {
+      sendToApp(appId, kEventMetric, metricRecord(metric, *profileId, appId));
+    }
+  }
+}
+
+void Core::sendToApp(std::int64_t appId, std::string_view event, ipc::Object record) {
+  // Each receiver but the last gets a copy.
+  const EventSink* previous = nullptr;
+  for (const auto& [id, session] : sessions_) {
+    if (!session.eventsOn || session.appId != appId) continue;
+    if (previous != nullptr) (*previous)(event, record);
+    previous = &session.sink;
+  }
+  if (previous != nullptr) (*previous)(event, std::move(record));
+}
+
+}  // namespace tarn::service

@@ -1,0 +1,78 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "tarn/CommandResult.h"
+#include "tarn/Ipc.h"
+#include "tarn/service/Apps.h"
+#include "tarn/service/Configuration.h"
+#include "tarn/service/MetricSource.h"
+
+namespace tarn::service {
+
+class Arguments;
+
+// The baseband manager service without its transport: client sessions, the metric configuration
+// of each app, the commands, and the fan-out of metrics and trigger events to the sessions.
+//
+// Every member may be called from any thread.
+class Core {
+ public:
+  using SessionId = std::uint64_t;
+  // Receives one session's events: the event's name and its record.
+  using EventSink = std::function<void(std::string_view event, ipc::Object record)>;
+
+  // Starts `source` (none: a baseband that reports nothing) and stops it again on destruction.
+  explicit Core(std::shared_ptr<MetricSource> source = nullptr,
+                std::vector<App> apps = registeredApps());
+  ~Core();
+  Core(const Core&) = delete;
+  Core& operator=(const Core&) = delete;
+
+  // A session receives the events of the app registered under its client name, once its events
+  // are on. Sinks run while the service holds its lock, so they must not call back into it.
+  SessionId openSession(const std::string& clientName, EventSink sink);
+  // No sink call for the session runs after this returns.
+  void closeSession(SessionId session);
+  void setEventsOn(SessionId session, bool on);
+
+  CommandResult perform(std::string_view command, const ipc::Object& input);
+
+ private:
+  struct Session {
+    std::optional<std::int64_t> appId;
+    EventSink sink;
+    bool eventsOn = false;
+  };
+  using Command = void (Core::*)(const Arguments&);
+
+  static const std::unordered_map<std::string_view, Command>& commands();
+
+  void addConfiguration(const Arguments& arguments);
+  void clearConfiguration(const Arguments& arguments);
+  void queryMetric(const Arguments& arguments);
+
+  std::int64_t knownAppId(const Arguments& arguments) const;
+  void deliver(const Metric& metric);
+  // Needs mutex_ held.
+  void sendToApp(std::int64_t appId, std::string_view event, ipc::Object record);
+
+  const std::vector<App> apps_;
+  const std::shared_ptr<MetricSource> source_;
+
+  std::mutex mutex_;
+  std::map<SessionId, Session> sessions_;
+  SessionId lastSession_ = 0;
+  std::unordered_map<std::int64_t, Configuration> configurations_;
+};
+
+}  // namespace tarn::service

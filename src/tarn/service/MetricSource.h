@@ -1,0 +1,29 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <optional>
+
+#include "platform/Value.h"
+
+namespace tarn::service {
+
+struct Metric {
+  std::uint32_t metricId;   // full metric ID, e.g. 0x3CD313
+  platform::Bytes payload;  // one encoded record
+};
+
+// Produces the metrics a baseband delivers, on its own schedule.
+class MetricSource {
+ public:
+  virtual ~MetricSource() = default;
+  // Starts producing; `deliver` may be called from any one thread the source owns, in delivery
+  // order.
+  virtual void start(std::function<void(Metric)> deliver) = 0;
+  // Stops producing; no `deliver` call runs after stop() returns.
+  virtual void stop() = 0;
+  // The metric that answers a query, if the source has one (the SIM files for 0x3C0013).
+  virtual std::optional<Metric> query(std::uint32_t metricId) = 0;
+};
+
+}  // namespace tarn::service

@@ -1,0 +1,79 @@
+#include "tarn/sim/SimulatorSource.h"
+
+#include <chrono>
+#include <cmath>
+#include <stdexcept>
+#include <vector>
+
+#include "tarn/sim/MetricIds.h"
+
+namespace tarn::sim {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+// How often the worker wakes to deliver what has come due, in wall-clock time.
+constexpr auto kTick = std::chrono::milliseconds(20);
+
+std::uint64_t systemNowMs() {
+  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::milliseconds>(
+                                        std::chrono::system_clock::now().time_since_epoch())
+                                        .count());
+}
+
+double checkedSpeed(double speed) {
+  if (!(speed > 0.0)) throw std::invalid_argument("the simulator's speed must be above 0");
+  return speed;
+}
+
+}  // namespace
+
+SimulatorSource::SimulatorSource(std::uint64_t seed, double speed,
+                                 std::optional<std::uint64_t> startEpochMs)
+    : speed_(checkedSpeed(speed)), simulator_(seed, startEpochMs.value_or(systemNowMs())) {}
+
+SimulatorSource::~SimulatorSource() {
+  stop();
+}
+
+void SimulatorSource::start(std::function<void(service::Metric)> deliver) {
+  std::lock_guard lock(mutex_);
+  if (worker_.joinable()) return;
+  worker_ = std::jthread(
+      [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
+}
+
+void SimulatorSource::stop() {
+  std::jthread worker;
+  {
+    std::lock_guard lock(mutex_);
+    worker = std::move(worker_);
+  }
+  // Leaving this scope asks the worker to stop and joins it.
+}
+
+std::optional<service::Metric> SimulatorSource::query(std::uint32_t metricId) {
+  if (metricId != metric_id::kSimFiles) return std::nullopt;
+  std::lock_guard lock(mutex_);
+  return simulator_.simFiles();
+}
+
+void SimulatorSource::run(std::stop_token stop,
+                          const std::function<void(service::Metric)>& deliver) {
+  const Clock::time_point began = Clock::now();
+  double simulatedMs = 0.0;  // simulated time advanced since `began`
+  std::unique_lock lock(mutex_);
+  while (!wake_.wait_for(lock, stop, kTick, [&stop] { return stop.stop_requested(); })) {
+    const double wallMs = std::chrono::duration<double, std::milli>(Clock::now() - began).count();
+    const double dueMs = std::floor(wallMs * speed_ - simulatedMs);
+    if (dueMs < 1.0) continue;
+    simulatedMs += dueMs;
+    std::vector<TimedMetric> metrics = simulator_.advance(static_cast<std::uint64_t>(dueMs));
+    lock.unlock();
+    for (TimedMetric& timed : metrics)
+      deliver(std::move(timed.metric));
+    lock.lock();
+  }
+}
+
+}  // namespace tarn::sim

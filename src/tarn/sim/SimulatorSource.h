@@ -1,0 +1,44 @@
+#pragma once
+
+#include <condition_variable>
+#include <cstdint>
+#include <functional>
+#include <mutex>
+#include <optional>
+#include <stop_token>
+#include <thread>
+
+#include "tarn/service/MetricSource.h"
+#include "tarn/sim/Simulator.h"
+
+namespace tarn::sim {
+
+// Runs the simulator on its own thread in real time, scaled by a speed factor (2 runs the
+// drive twice as fast), and delivers each metric when its simulated time comes.
+class SimulatorSource final : public service::MetricSource {
+ public:
+  // `speed` must be above 0 (std::invalid_argument otherwise). Simulated time starts at
+  // `startEpochMs`, or at the system clock's time of construction.
+  explicit SimulatorSource(std::uint64_t seed, double speed = 1.0,
+                           std::optional<std::uint64_t> startEpochMs = std::nullopt);
+  ~SimulatorSource() override;
+  SimulatorSource(const SimulatorSource&) = delete;
+  SimulatorSource& operator=(const SimulatorSource&) = delete;
+
+  // Starts or, after stop(), resumes the drive where it stopped. Does nothing while running.
+  void start(std::function<void(service::Metric)> deliver) override;
+  // Must not be called from `deliver`.
+  void stop() override;
+  std::optional<service::Metric> query(std::uint32_t metricId) override;
+
+ private:
+  void run(std::stop_token stop, const std::function<void(service::Metric)>& deliver);
+
+  const double speed_;
+  std::mutex mutex_;  // guards the simulator and the worker
+  std::condition_variable_any wake_;
+  Simulator simulator_;
+  std::jthread worker_;
+};
+
+}  // namespace tarn::sim

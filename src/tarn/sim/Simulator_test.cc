@@ -1,0 +1,392 @@
+#include "tarn/sim/Simulator.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <map>
+#include <set>
+#include <string>
+
+#include "messages/Records.h"
+#include "platform/Log.h"
+#include "tarn/sim/Bands.h"
+#include "tarn/sim/Identity.h"
+#include "tarn/sim/MetricIds.h"
+#include "tarn/sim/SimFiles.h"
+
+namespace tarn::sim {
+namespace {
+
+using namespace messages;
+namespace id = metric_id;
+
+constexpr std::uint64_t kStartMs = 1'700'000'000'000;
+constexpr std::uint64_t kTenMinutesMs = 600'000;
+
+std::vector<TimedMetric> driveFor(std::uint64_t seed, std::uint64_t ms) {
+  Simulator simulator(seed, kStartMs);
+  return simulator.advance(ms);
+}
+
+bool sameStream(const std::vector<TimedMetric>& a, const std::vector<TimedMetric>& b) {
+  return std::equal(a.begin(), a.end(), b.begin(), b.end(), [](const auto& x, const auto& y) {
+    return x.atMs == y.atMs && x.metric.metricId == y.metric.metricId &&
+           x.metric.payload == y.metric.payload;
+  });
+}
+
+// Field 1 of every record is its timestamp; records are written in field order.
+std::uint64_t leadingTimestamp(const platform::Bytes& payload) {
+  if (payload.empty() || payload[0] != 0x08) return 0;
+  std::uint64_t value = 0;
+  for (std::size_t i = 1, shift = 0; i < payload.size() && shift < 64; ++i, shift += 7) {
+    value |= static_cast<std::uint64_t>(payload[i] & 0x7F) << shift;
+    if ((payload[i] & 0x80) == 0) break;
+  }
+  return value;
+}
+
+template <class Record>
+std::shared_ptr<Record> decode(const service::Metric& metric) {
+  platform::log::Capture quiet;  // field 19 of some records is logged as a metric-ID tag
+  return Record::initWithData(&metric.payload);
+}
+
+TEST(ASimulator, ProducesTheSameBytesForTheSameSeedAndOthersForAnother) {
+  const auto first = driveFor(3, 120'000);
+  EXPECT_TRUE(sameStream(first, driveFor(3, 120'000)));
+  EXPECT_FALSE(sameStream(first, driveFor(4, 120'000)));
+}
+
+TEST(ASimulator, GivesTheSameStreamHoweverTimeIsSliced) {
+  const auto whole = driveFor(5, 60'000);
+  Simulator sliced(5, kStartMs);
+  std::vector<TimedMetric> pieces;
+  for (std::uint64_t slice : {37u, 250u, 1u, 999u}) {
+    for (int i = 0; i < 15; ++i) {
+      auto part = sliced.advance(slice);
+      pieces.insert(pieces.end(), part.begin(), part.end());
+    }
+  }
+  auto rest = sliced.advance(60'000 - 15 * (37 + 250 + 1 + 999));
+  pieces.insert(pieces.end(), rest.begin(), rest.end());
+  EXPECT_TRUE(sameStream(whole, pieces));
+  EXPECT_EQ(sliced.nowMs(), kStartMs + 60'000);
+}
+
+// One drive shared by the tests below: out of the city, through the countryside into the
+// GSM-only valley, and back.
+class TenMinuteDrive : public ::testing::Test {
+ protected:
+  static const std::vector<TimedMetric>& all() {
+    static const std::vector<TimedMetric> metrics = driveFor(7, kTenMinutesMs);
+    return metrics;
+  }
+  static std::vector<TimedMetric> only(std::uint32_t metricId) {
+    std::vector<TimedMetric> matching;
+    std::copy_if(all().begin(), all().end(), std::back_inserter(matching),
+                 [metricId](const TimedMetric& m) { return m.metric.metricId == metricId; });
+    return matching;
+  }
+  template <class Record>
+  static std::vector<std::shared_ptr<Record>> records(std::uint32_t metricId) {
+    std::vector<std::shared_ptr<Record>> decoded;
+    for (const TimedMetric& m : only(metricId))
+      decoded.push_back(decode<Record>(m.metric));
+    return decoded;
+  }
+};
+
+TEST_F(TenMinuteDrive, DeliversEveryMetricKindInTimeOrderStampedWithItsDeliveryTime) {
+  std::set<std::uint32_t> seen;
+  std::uint64_t previous = kStartMs;
+  for (const TimedMetric& m : all()) {
+    seen.insert(m.metric.metricId);
+    EXPECT_GE(m.atMs, previous);
+    previous = m.atMs;
+    EXPECT_EQ(leadingTimestamp(m.metric.payload), m.atMs) << std::hex << m.metric.metricId;
+  }
+  for (const std::uint32_t metricId : id::kAll) {
+    EXPECT_TRUE(seen.contains(metricId)) << std::hex << metricId;
+  }
+}
+
+TEST_F(TenMinuteDrive, RepeatsMeasurementsAtTheirBasebandPeriods) {
+  const std::map<std::uint32_t, std::uint64_t> periods = {
+      {id::kLteServingCellMeas, 1000}, {id::kLteRsrpRsrqSinr, 1000},
+      {id::kLteNeighbourMeas, 3000},   {id::kUmtsServingCellMeas, 1000},
+      {id::kUmtsNeighbourMeas, 3000},  {id::kGsmIdleServingMeas, 940},
+      {id::kGsmCsRfMeas, 480}};
+  for (const auto& [metricId, period] : periods) {
+    const auto reports = only(metricId);
+    ASSERT_GT(reports.size(), 4u) << std::hex << metricId;
+    // Apart from pauses while a measurement does not apply, reports follow the period.
+    std::size_t onTime = 0;
+    for (std::size_t i = 1; i < reports.size(); ++i) {
+      const std::uint64_t gap = reports[i].atMs - reports[i - 1].atMs;
+      if (gap + 20 >= period && gap <= period + 20) ++onTime;
+    }
+    EXPECT_GE(onTime, (reports.size() - 1) * 9 / 10) << std::hex << metricId;
+  }
+}
+
+TEST_F(TenMinuteDrive, ReportsRrcStatesOnlyWhenTheyChange) {
+  const auto lte = records<KCellularLteRrcState>(id::kLteRrcState);
+  for (std::size_t i = 1; i < lte.size(); ++i) {
+    EXPECT_NE(lte[i]->state(), lte[i - 1]->state());
+    EXPECT_EQ(lte[i]->prevState(), lte[i - 1]->state());
+  }
+  const auto umts = records<KCellularWcdmaRrcConnectionState>(id::kUmtsRrcState);
+  for (std::size_t i = 1; i < umts.size(); ++i)
+    EXPECT_NE(umts[i]->state(), umts[i - 1]->state());
+}
+
+template <class Record>
+bool decodes(const service::Metric& metric) {
+  return decode<Record>(metric) != nullptr;
+}
+
+TEST_F(TenMinuteDrive, SendsPayloadsThatDecodeWithTheRecordOfTheirMetric) {
+  using Check = bool (*)(const service::Metric&);
+  const std::map<std::uint32_t, Check> checks = {
+      {id::kLteRrcState, decodes<KCellularLteRrcState>},
+      {id::kLteCdrxConfig, decodes<KCellularLteCdrxConfig>},
+      {id::kLteServingCellInfo, decodes<KCellularLteScellInfo>},
+      {id::kLteSelReselInfo, decodes<KCellularLteSelReselCellInfo>},
+      {id::kLteServingCellMeas, decodes<KCellularLteServingCellMeasurement>},
+      {id::kLteTxPower, decodes<KCellularLteTxPower>},
+      {id::kLteRsrpRsrqSinr, decodes<KCellularLteRsrpRsrqSinr>},
+      {id::kLteComponentCarriers, decodes<KCellularLteComponentCarrierInfo>},
+      {id::kLteCaStatus, decodes<KCellularLteCarrierAggregationStatus>},
+      {id::kLteSecondaryCellMeas, decodes<KCellularLteSecondaryCellMeasurements>},
+      {id::kLteInterRatMeas, decodes<KCellularLteNbrInterRatCellMeas>},
+      {id::kLteNeighbourMeas, decodes<KCellularLteNbrEutraCellMeas>},
+      {id::kUmtsRrcState, decodes<KCellularWcdmaRrcConnectionState>},
+      {id::kUmtsRrcConfig, decodes<KCellularWcdmaRrcConfiguration>},
+      {id::kUmtsServingCellInfo, decodes<KCellularWcdmaCellInfo>},
+      {id::kUmtsServingCellMeas, decodes<KCellularWcdmaScellMeasurement>},
+      {id::kUmtsTxPower, decodes<KCellularWcdmaTxPower>},
+      {id::kUmtsSelReselInfo, decodes<KCellularWcdmaSelReselCellInfo>},
+      {id::kUmtsNeighbourMeas, decodes<KCellularWcdmaNbrCellMeas>},
+      {id::kGsmServingCellInfo, decodes<KCellularGsmScellInfo>},
+      {id::kGsmIdleConfig, decodes<KCellularGsmIdleConfig>},
+      {id::kGsmIdleServingMeas, decodes<KCellularGsmIdleScellMeasurement>},
+      {id::kGsmCsRfMeas, decodes<KCellularGsmCsRfMeasurement>},
+      {id::kGsmNeighbourMeas, decodes<KCellularGsmGrrEventMeasCr>},
+      {id::kGsmGprsConfig, decodes<KCellularGsmGprsConfig>},
+      {id::kMmCommonInfo, decodes<KCellularMmCommonInfo>},
+      {id::kMmContext, decodes<KCellularMmContext>},
+      {id::kGmmContext, decodes<KCellularGmmContext>},
+      {id::kEmmContext, decodes<KCellularEmmContext>},
+      {id::kActiveBearers, decodes<KCellularActivatedBearerContexts>},
+      {id::kSimFiles, decodes<KCellularSimCardFiles>},
+  };
+  for (const TimedMetric& m : all()) {
+    const auto check = checks.find(m.metric.metricId);
+    if (check == checks.end()) continue;  // the radio link failure has no record
+    EXPECT_TRUE(check->second(m.metric)) << std::hex << m.metric.metricId;
+  }
+}
+
+bool inLteBand(std::uint32_t band, std::uint32_t earfcn) {
+  const bands::LteBand& plan = bands::lteBand(band);
+  return earfcn >= plan.dlFirstEarfcn && earfcn <= plan.dlLastEarfcn;
+}
+
+TEST_F(TenMinuteDrive, ReportsLteCellsAndLevelsInTheirPhysicalRanges) {
+  for (const auto& info : records<KCellularLteScellInfo>(id::kLteServingCellInfo)) {
+    EXPECT_LT(info->phyCellId(), 504u);
+    EXPECT_TRUE(inLteBand(info->freqBandInd(), info->dlFreq()));
+    EXPECT_EQ(info->ulFreq(), bands::lteUlEarfcn(info->freqBandInd(), info->dlFreq()));
+    EXPECT_TRUE(info->dlBw() == 50 || info->dlBw() == 100);
+    EXPECT_EQ(info->selPlmnMcc(), 1u);
+  }
+  for (const auto& meas : records<KCellularLteNbrEutraCellMeas>(id::kLteNeighbourMeas)) {
+    for (const auto& cell : meas->measNbrEutras()) {
+      EXPECT_LT(cell->nbrPhysCellId(), 504u);
+      EXPECT_TRUE(inLteBand(cell->freqBandInd(), cell->nbrEarfcn()));
+      EXPECT_TRUE(cell->nbrRsrp() >= 0 && cell->nbrRsrp() <= 97);
+      EXPECT_TRUE(cell->nbrRsrq() >= 0 && cell->nbrRsrq() <= 34);
+    }
+  }
+  for (const auto& status : records<KCellularLteCarrierAggregationStatus>(id::kLteCaStatus)) {
+    for (const auto& scc : status->sccLists()) {
+      EXPECT_TRUE(inLteBand(scc->dlRfBand(), scc->dlEarfcn()));
+      EXPECT_LE(scc->dlBandwidth(), 5u);
+      EXPECT_TRUE(scc->rsrp() >= -14000 && scc->rsrp() <= -4400) << scc->rsrp();
+      EXPECT_TRUE(scc->rsrq() >= -1950 && scc->rsrq() <= -300) << scc->rsrq();
+      EXPECT_LT(scc->rssi(), -2000);
+    }
+  }
+  for (const auto& sample : records<KCellularLteRsrpRsrqSinr>(id::kLteRsrpRsrqSinr)) {
+    for (const auto& values : sample->instValues()) {
+      EXPECT_TRUE(values->rsrp0() >= -150 && values->rsrp0() <= -40) << values->rsrp0();
+      EXPECT_TRUE(values->sinr0() >= -40 && values->sinr0() <= 60) << values->sinr0();
+    }
+  }
+  for (const auto& power : records<KCellularLteTxPower>(id::kLteTxPower)) {
+    for (const auto& sample : power->txPowerInfos()) {
+      EXPECT_LE(sample->puschTxPower(), 23);
+      EXPECT_LT(sample->subframeIndex(), 10u);
+    }
+  }
+}
+
+TEST_F(TenMinuteDrive, ReportsUmtsAndGsmCellsAndLevelsInTheirPhysicalRanges) {
+  for (const auto& info : records<KCellularWcdmaCellInfo>(id::kUmtsServingCellInfo)) {
+    EXPECT_LT(info->psc(), 512u);
+    const bands::UmtsBand& band =
+        bands::umtsBand(info->wcdmaBand() == SYS_BAND_WCDMA_I_IMT_2000 ? 1 : 8);
+    EXPECT_TRUE(info->dlUarfcn() >= band.dlFirstUarfcn && info->dlUarfcn() <= band.dlLastUarfcn);
+  }
+  for (const auto& meas : records<KCellularWcdmaNbrCellMeas>(id::kUmtsNeighbourMeas)) {
+    for (const auto& cell : meas->measUtraResults()) {
+      EXPECT_TRUE(cell->rscp() >= 0 && cell->rscp() <= 91);
+      EXPECT_LE(cell->ecno(), 49u);
+    }
+    for (const auto& cell : meas->measGsmResults())
+      EXPECT_LE(cell->rxlev(), 63u);
+  }
+  for (const auto& info : records<KCellularGsmScellInfo>(id::kGsmServingCellInfo)) {
+    const bands::GsmBand& band = bands::gsmBand(info->gsmBand());
+    EXPECT_TRUE(info->arfcn() >= band.firstArfcn && info->arfcn() <= band.lastArfcn);
+    EXPECT_LT(info->bsic(), 64u);
+  }
+  for (const auto& meas : records<KCellularGsmIdleScellMeasurement>(id::kGsmIdleServingMeas)) {
+    EXPECT_TRUE(meas->idleRxlevDBm() >= -110 && meas->idleRxlevDBm() <= -20);
+  }
+  for (const auto& meas : records<KCellularGsmCsRfMeasurement>(id::kGsmCsRfMeas)) {
+    EXPECT_LE(meas->csRxlevSub(), 63u);
+    EXPECT_LE(meas->csRxqualSub(), 7u);
+    ASSERT_GT(meas->csTxPwrsCount(), 0u);
+    for (std::size_t i = 0; i < meas->csTxPwrsCount(); ++i) {
+      EXPECT_TRUE(meas->csTxPwrAtIndex(i) >= 5 && meas->csTxPwrAtIndex(i) <= 33);
+    }
+  }
+}
+
+TEST_F(TenMinuteDrive, HandsOverBetweenCellsAndCarriers) {
+  std::set<std::uint32_t> pcis;
+  std::set<std::uint32_t> earfcns;
+  for (const auto& info : records<KCellularLteScellInfo>(id::kLteServingCellInfo)) {
+    pcis.insert(info->phyCellId());
+    earfcns.insert(info->dlFreq());
+  }
+  EXPECT_GE(pcis.size(), 3u);
+  EXPECT_EQ(earfcns, (std::set<std::uint32_t>{1300, 6300}));
+}
+
+TEST_F(TenMinuteDrive, ActivatesCarrierAggregationAndDeactivatesItAgain) {
+  bool activated = false;
+  bool deactivatedAfterwards = false;
+  for (const auto& status : records<KCellularLteCarrierAggregationStatus>(id::kLteCaStatus)) {
+    for (const auto& scc : status->sccLists()) {
+      if (scc->state() == SecondaryComponentCarrier::SCC_STATE_ACTIVATED) activated = true;
+      if (activated && scc->state() != SecondaryComponentCarrier::SCC_STATE_ACTIVATED) {
+        deactivatedAfterwards = true;
+      }
+    }
+  }
+  EXPECT_TRUE(activated);
+  EXPECT_TRUE(deactivatedAfterwards);
+}
+
+TEST_F(TenMinuteDrive, FallsBackToUmtsThenGsmAndReturnsToLte) {
+  const std::map<std::uint32_t, char> rats = {{id::kLteServingCellInfo, 'L'},
+                                              {id::kUmtsServingCellInfo, 'U'},
+                                              {id::kGsmServingCellInfo, 'G'}};
+  std::string path;
+  for (const TimedMetric& m : all()) {
+    const auto rat = rats.find(m.metric.metricId);
+    if (rat != rats.end() && (path.empty() || path.back() != rat->second)) path += rat->second;
+  }
+  ASSERT_EQ(path.substr(0, 3), "LUG") << path;
+  EXPECT_NE(path.find("UL", 3), std::string::npos) << path;
+}
+
+TEST_F(TenMinuteDrive, ConnectsReleasesAndRecoversWithRealisticCauses) {
+  using Rrc = KCellularLteRrcState;
+  std::set<std::pair<int, int>> transitions;  // state and cause
+  for (const auto& report : records<Rrc>(id::kLteRrcState)) {
+    transitions.insert({report->state(), report->cause()});
+  }
+  for (const auto& expected : std::vector<std::pair<int, int>>{
+           {Rrc::KLTE_RRC_STATE_CONNECTED, Rrc::KLTE_RRC_CAUSE_EST_MO_SIGNAL},
+           {Rrc::KLTE_RRC_STATE_CONNECTED, Rrc::KLTE_RRC_CAUSE_EST_MO_DATA},
+           {Rrc::KLTE_RRC_STATE_ENDING, Rrc::KLTE_RRC_CAUSE_REL_OTHER},
+           {Rrc::KLTE_RRC_STATE_IDLE, Rrc::KLTE_RRC_CAUSE_REL_OTHER},
+           {Rrc::KLTE_RRC_STATE_ATMPT_CONNECTION, Rrc::KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP},
+       }) {
+    EXPECT_TRUE(transitions.contains(expected)) << expected.first << " " << expected.second;
+  }
+  // Each radio link failure is followed by an attempt to re-establish.
+  for (const TimedMetric& failure : only(id::kLteRadioLinkFailure)) {
+    const auto after = std::find_if(all().begin(), all().end(), [&](const TimedMetric& m) {
+      return m.atMs >= failure.atMs && m.metric.metricId == id::kLteRrcState;
+    });
+    ASSERT_NE(after, all().end());
+    EXPECT_EQ(decode<Rrc>(after->metric)->cause(), Rrc::KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP);
+  }
+}
+
+TEST_F(TenMinuteDrive, RegistersAndMovesBearersWithTheRat) {
+  std::vector<std::size_t> bearerCounts;
+  for (const auto& report : records<KCellularActivatedBearerContexts>(id::kActiveBearers)) {
+    EXPECT_EQ(report->bearerContextCount(), report->bearerContextsCount());
+    bearerCounts.push_back(report->bearerContextsCount());
+  }
+  // The IMS connection is dropped on GSM and set up again back on LTE.
+  ASSERT_FALSE(bearerCounts.empty());
+  EXPECT_EQ(bearerCounts.front(), 2u);
+  EXPECT_NE(std::find(bearerCounts.begin(), bearerCounts.end(), 1u), bearerCounts.end());
+  EXPECT_EQ(bearerCounts.back(), 2u);
+
+  const auto emm = records<KCellularEmmContext>(id::kEmmContext);
+  EXPECT_EQ(emm.front()->regStatus(), KCellularEmmContext::KREG_STATUS_REGISTRATION_IN_PROGRESS);
+  EXPECT_EQ(emm.back()->regStatus(), KCellularEmmContext::KREG_STATUS_NORMAL_SERVICE);
+  std::set<int> routingProcedures;
+  for (const auto& gmm : records<KCellularGmmContext>(id::kGmmContext)) {
+    routingProcedures.insert(gmm->regProc());
+  }
+  EXPECT_TRUE(routingProcedures.contains(KCellularGmmContext::KNAS_MM_REG_PROC_COMBINED_RAU));
+  EXPECT_TRUE(
+      routingProcedures.contains(KCellularGmmContext::KNAS_MM_REG_PROC_ROUTING_AREA_UPDATE));
+}
+
+TEST(TheSimFiles, HoldTheSubscriptionTheNasReports) {
+  Simulator simulator(9, kStartMs);
+  const auto metrics = simulator.advance(5'000);
+  const service::Metric query = simulator.simFiles();
+  EXPECT_EQ(query.metricId, id::kSimFiles);
+  const auto files = decode<KCellularSimCardFiles>(query);
+  ASSERT_TRUE(files);
+  std::map<std::uint32_t, platform::Bytes> contents;
+  for (const auto& file : files->efLists())
+    contents[file->efId()] = *file->content();
+
+  const auto common = std::find_if(metrics.begin(), metrics.end(), [](const TimedMetric& m) {
+    return m.metric.metricId == id::kMmCommonInfo;
+  });
+  ASSERT_NE(common, metrics.end());
+  EXPECT_EQ(contents[ef::kImsi], *decode<KCellularMmCommonInfo>(common->metric)->imsi());
+
+  std::string iccid;
+  for (const std::uint8_t byte : contents[ef::kIccid]) {
+    for (const int digit : {byte & 0x0F, byte >> 4}) {
+      if (digit <= 9) iccid += static_cast<char>('0' + digit);
+    }
+  }
+  ASSERT_EQ(iccid.size(), 19u);
+  EXPECT_EQ(identity::luhnCheckDigit(iccid.substr(0, 18)), iccid.back());
+  EXPECT_EQ(contents[ef::kAdministrativeData].back(), 2);  // two-digit MNC
+  EXPECT_EQ(std::string(contents[ef::kServiceProviderName].begin() + 1,
+                        contents[ef::kServiceProviderName].begin() + 13),
+            "Test Network");
+  // Once attached, the EPS location holds the GUTI's PLMN.
+  EXPECT_EQ(platform::Bytes(contents[ef::kEpsLocation].begin() + 2,
+                            contents[ef::kEpsLocation].begin() + 5),
+            identity::encodePlmn({1, 1, 2}));
+}
+
+}  // namespace
+}  // namespace tarn::sim

@@ -41,8 +41,15 @@ class Reader {
   // Up to 10 bytes, 7 bits each, least significant group first. A varint
   // whose tenth byte still continues yields 0 without an error.
   std::uint64_t readVarint() {
-    if (!error_ && position_ <= length_ && length_ - position_ >= kMaxVarintBytes) {
-      return readVarintUnchecked();
+    if (!error_ && position_ < length_) {
+      // Keys and most values fit in one byte; nested records are short, so a varint is often
+      // within ten bytes of its region's end, where the unchecked read would not be allowed.
+      const std::uint8_t first = bytes_[position_];
+      if ((first & 0x80) == 0) {
+        ++position_;
+        return first;
+      }
+      if (length_ - position_ >= kMaxVarintBytes) return readVarintUnchecked();
     }
     return readVarintChecked();
   }

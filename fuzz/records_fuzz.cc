@@ -2,8 +2,8 @@
 // whatever came out. A malformed payload must never crash, hang or read out
 // of bounds, and whatever a record holds must survive its own encoding.
 #include <cstdint>
-#include <cstdlib>
 #include <cstdio>
+#include <cstdlib>
 
 #include "codec/Reader.h"
 #include "messages/Records.h"
@@ -12,7 +12,8 @@
 namespace {
 
 [[noreturn]] void fail(std::string_view recordClass, const char* what) {
-  std::fprintf(stderr, "%.*s: %s\n", static_cast<int>(recordClass.size()), recordClass.data(), what);
+  std::fprintf(stderr, "%.*s: %s\n", static_cast<int>(recordClass.size()), recordClass.data(),
+               what);
   std::abort();
 }
 
@@ -32,8 +33,13 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const auto again = recordClass.create();
     codec::Reader rereader(encoded);
     if (!again->readFrom(rereader)) fail(recordClass.name, "its own encoding does not decode");
-    if (!again->isEqual(*record)) fail(recordClass.name, "its own encoding decodes to another record");
+    if (!again->isEqual(*record))
+      fail(recordClass.name, "its own encoding decodes to another record");
     if (again->hash() != record->hash()) fail(recordClass.name, "equal records hash differently");
+    if (!recordClass.copyWithZone(*record)->isEqual(*record))
+      fail(recordClass.name, "a deep copy differs");
+    recordClass.mergeFrom(*again, *record);
+    (void)again->data();
   }
   return 0;
 }

@@ -15,6 +15,11 @@ struct RecordClass {
   // False for the records that decode field numbers in full and apply no
   // metric-ID tag rule.
   bool appliesMetricIdTagRule;
+  // The class's own copy and merge operations. Every record passed must be of
+  // this class; another throws std::invalid_argument.
+  std::shared_ptr<codec::Codable> (*copyWithZone)(const codec::Codable& record);
+  void (*copyTo)(const codec::Codable& record, codec::Codable& other);
+  void (*mergeFrom)(codec::Codable& record, const codec::Codable& other);
 };
 
 // Every record class, in schema order.

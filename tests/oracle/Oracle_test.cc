@@ -7,7 +7,6 @@
 #include "messages/Records.h"
 #include "options.pb.h"
 #include "oracle/RandomMessage.h"
-#include "oracle/RecordOperations.h"
 #include "oracle/ReflectedDictionary.h"
 
 namespace {
@@ -102,7 +101,6 @@ TEST(TheOracle, KnowsEveryRecordClassWithItsTagRule) {
     const auto message = oracle::newMessageNamed(recordClass.name);
     ASSERT_NE(message, nullptr) << recordClass.name;
     EXPECT_EQ(recordClass.create()->className(), recordClass.name);
-    EXPECT_NE(oracle::recordOperationsNamed(recordClass.name), nullptr) << recordClass.name;
     EXPECT_EQ(recordClass.appliesMetricIdTagRule,
               !message->GetDescriptor()->options().GetExtension(norvo::raw_field_numbers))
         << recordClass.name;
@@ -136,9 +134,11 @@ TEST(EveryRecord, WritesTheBytesLibprotobufWroteAndLibprotobufReadsThemBack) {
 
 TEST(EveryRecord, CopiesDeeplyAndShallowlyToEqualRecordsWithEqualHashes) {
   checkEverySample([](const Sample& sample, const codec::Codable& record) {
-    const auto& operations = *oracle::recordOperationsNamed(sample.recordClass->name);
-    for (const auto& [how, copy] : {std::pair{"copyWithZone", operations.copyWithZone(record)},
-                                    std::pair{"copyTo", operations.copiedToNew(record)}}) {
+    const auto& recordClass = *sample.recordClass;
+    const auto copiedTo = recordClass.create();
+    recordClass.copyTo(record, *copiedTo);
+    for (const auto& [how, copy] : {std::pair{"copyWithZone", recordClass.copyWithZone(record)},
+                                    std::pair{"copyTo", copiedTo}}) {
       if (!copy->isEqual(record) || !record.isEqual(*copy))
         return AssertionFailure() << " the " << how << " copy is not equal";
       if (copy->hash() != record.hash())
@@ -165,10 +165,9 @@ TEST(EveryRecord, EqualsAnotherExactlyWhenLibprotobufEncodesBothAlike) {
 TEST(EveryRecord, MergesAnotherAsLibprotobufMergesIt) {
   checkEveryPairOfSamples([](const Sample& first, const codec::Codable& firstRecord,
                              const Sample& second, const codec::Codable& secondRecord) {
-    const auto& operations = *oracle::recordOperationsNamed(first.recordClass->name);
     const auto merged = first.recordClass->create();
-    operations.mergeFrom(*merged, firstRecord);
-    operations.mergeFrom(*merged, secondRecord);
+    first.recordClass->mergeFrom(*merged, firstRecord);
+    first.recordClass->mergeFrom(*merged, secondRecord);
     const std::unique_ptr<Message> expected(first.message->New());
     expected->CopyFrom(*first.message);
     expected->MergeFrom(*second.message);

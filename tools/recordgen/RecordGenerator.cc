@@ -131,20 +131,39 @@ void writeRegistry(const std::vector<const FileDescriptor*>& files, GeneratorCon
   std::unique_ptr<google::protobuf::io::ZeroCopyOutputStream> out(context.Open("Records.cc"));
   Printer p(out.get(), '$');
   p.Print(kBanner, "source", "proto/*.proto");
+  // Each class's operations behind function pointers, so that tools and tests
+  // reach every record without naming its class.
   p.Print(
       "#include \"messages/Records.h\"\n\n"
+      "#include <stdexcept>\n"
+      "#include <typeinfo>\n\n"
       "namespace messages {\n"
       "namespace {\n\n"
       "template <class Record>\n"
-      "std::shared_ptr<codec::Codable> create() {\n"
-      "  return std::make_shared<Record>();\n"
+      "Record& as(const codec::Codable& record) {\n"
+      "  if (typeid(record) != typeid(Record)) throw std::invalid_argument(\"a record of another "
+      "class\");\n"
+      "  return const_cast<Record&>(static_cast<const Record&>(record));\n"
+      "}\n\n"
+      "template <class Record>\n"
+      "constexpr RecordClass recordClass(std::string_view name, bool appliesMetricIdTagRule) {\n"
+      "  return {name,\n"
+      "          []() -> std::shared_ptr<codec::Codable> { return std::make_shared<Record>(); },\n"
+      "          appliesMetricIdTagRule,\n"
+      "          [](const codec::Codable& record) -> std::shared_ptr<codec::Codable> {\n"
+      "            return as<Record>(record).copyWithZone();\n"
+      "          },\n"
+      "          [](const codec::Codable& record, codec::Codable& other) { "
+      "as<Record>(record).copyTo(as<Record>(other)); },\n"
+      "          [](codec::Codable& record, const codec::Codable& other) { "
+      "as<Record>(record).mergeFrom(as<Record>(other)); }};\n"
       "}\n\n"
       "constexpr RecordClass kRecordClasses[] = {\n");
   for (const auto* file : files) {
     for (int i = 0; i < file->message_type_count(); ++i) {
       const auto& record = *file->message_type(i);
-      p.Print("    {\"$Class$\", &create<$Class$>, $rule$},\n", "Class", className(record), "rule",
-              RecordEmitter(record).appliesMetricIdTagRule() ? "true" : "false");
+      p.Print("    recordClass<$Class$>(\"$Class$\", $rule$),\n", "Class", className(record),
+              "rule", RecordEmitter(record).appliesMetricIdTagRule() ? "true" : "false");
     }
   }
   p.Print(

@@ -12,10 +12,15 @@ void appendDescription(std::string& out, const Value& value, bool nested);
 
 void appendQuoted(std::string& out, std::string_view text) {
   out += '"';
-  for (char c : text) {
-    if (c == '"' || c == '\\') out += '\\';
-    out += c;
+  // Runs without quotes or backslashes go in whole: log lines quote many keys.
+  std::size_t run = 0;
+  for (std::size_t i = 0; i < text.size(); ++i) {
+    if (text[i] != '"' && text[i] != '\\') continue;
+    out.append(text.substr(run, i - run));
+    out += '\\';
+    run = i;
   }
+  out.append(text.substr(run));
   out += '"';
 }
 

@@ -1,0 +1,118 @@
+#include "store/Dispatch.h"
+
+#include <string>
+#include <unordered_map>
+#include <utility>
+
+#include "platform/Log.h"
+#include "store/Conversions.h"
+
+namespace store {
+
+namespace {
+
+using platform::Dictionary;
+
+// Runs the steps of one handler over the display dictionary it has just stored.
+class StepRunner {
+ public:
+  StepRunner(const Handler& handler, Dictionary& display, DisplayStore& store,
+             const TimestampFormatter& formatTimestamp)
+      : handler_(handler), display_(display), store_(store), formatTimestamp_(formatTimestamp) {}
+
+  void operator()(const ConvertDisplayEntry& step) const {
+    convertEntry(display_, step.conversion, formatTimestamp_);
+  }
+
+  void operator()(const ReplaceWithTextForm& step) const {
+    platform::Value* entry = display_.find(step.key);
+    if (entry == nullptr || !hasShape(*entry, step.shape)) return;
+    std::string text = entry->description();
+    if (step.logText) platform::log::plain(text);
+    *entry = std::move(text);
+  }
+
+  void operator()(const LogDisplayDictionary&) const {
+    std::string line = display_.description();
+    line.insert(0, handler_.logPrefix);
+    platform::log::plain(line);
+  }
+
+  void operator()(const RefreshKeys& step) const {
+    Dictionary& destination = step.destination(store_);
+    Dictionary refreshed;
+    refreshed.reserve(destination.size());
+    for (const auto& [key, value] : destination) {
+      const platform::Value* fresh = display_.find(key);
+      refreshed.append(key, fresh != nullptr ? *fresh : value);
+    }
+    for (const EntryConversion& conversion : step.conversions) {
+      convertEntry(refreshed, conversion, formatTimestamp_);
+    }
+    destination = std::move(refreshed);
+  }
+
+  void operator()(const CopyList& step) const {
+    const platform::Value* source = display_.find(step.key);
+    if (source == nullptr || !hasShape(*source, ValueShape::DictionaryList)) return;
+    const Dictionary& parent = step.parent(store_, display_);
+    platform::List rows;
+    rows.reserve(source->asList()->size());
+    for (const platform::Value& element : *source->asList()) {
+      const Dictionary& fields = *element.asDictionary();
+      Dictionary row;
+      row.reserve(fields.size() + step.parentKeys.size());
+      for (const auto& [key, value] : fields)
+        row.append(key, value);
+      for (const std::string_view key : step.parentKeys) {
+        if (const platform::Value* inherited = parent.find(key))
+          row.set(std::string(key), *inherited);
+      }
+      for (const EntryConversion& conversion : step.conversions) {
+        convertEntry(row, conversion, formatTimestamp_);
+      }
+      rows.emplace_back(std::move(row));
+    }
+    step.destination(store_) = std::move(rows);
+  }
+
+ private:
+  const Handler& handler_;
+  Dictionary& display_;
+  DisplayStore& store_;
+  const TimestampFormatter& formatTimestamp_;
+};
+
+const std::unordered_map<std::int64_t, const Handler*>& handlersByMetricID() {
+  static const auto* const handlers = [] {
+    auto* byID = new std::unordered_map<std::int64_t, const Handler*>;
+    for (const auto table : {lteHandlers(), umtsHandlers(), gsmNasHandlers()}) {
+      for (const Handler& handler : table)
+        byID->emplace(handler.metricID, &handler);
+    }
+    return byID;
+  }();
+  return *handlers;
+}
+
+}  // namespace
+
+const Handler* handlerFor(std::int64_t metricID) {
+  const auto& handlers = handlersByMetricID();
+  const auto found = handlers.find(metricID);
+  return found == handlers.end() ? nullptr : found->second;
+}
+
+bool runHandler(const Handler& handler, const platform::Bytes* payload, DisplayStore& store,
+                const TimestampFormatter& formatTimestamp) {
+  std::optional<Dictionary> decoded = handler.decode(payload);
+  if (!decoded) return false;
+  std::optional<Dictionary>& stored = store[handler.display];
+  stored = std::move(decoded);
+  const StepRunner runStep(handler, *stored, store, formatTimestamp);
+  for (const HandlerStep& step : handler.steps)
+    std::visit(runStep, step);
+  return true;
+}
+
+}  // namespace store

@@ -1,0 +1,102 @@
+// The whole intake of a metric (validation, decode, display dictionary, unit conversion, list
+// copies, timestamp text and log lines) next to the decode and dictionary conversion alone, over
+// the same simulated drive.
+#include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <vector>
+
+#include "store/Dispatch.h"
+#include "store/MetricValidator.h"
+#include "tarn/sim/Simulator.h"
+
+namespace {
+
+using store::MetricValidator;
+
+constexpr std::uint64_t kSeed = 20240611;
+constexpr std::uint64_t kStartMs = 1718100000000;  // 2024-06-11 10:00:00 UTC
+constexpr std::uint64_t kDriveMs = 10 * 60 * 1000;
+
+struct Corpus {
+  std::vector<platform::Dictionary> records;  // as the session hands them over
+  std::vector<const store::Handler*> handlers;
+  std::vector<platform::Bytes> payloads;
+};
+
+// Sends standard output, where the plain log lines go, to /dev/null while alive: the lines are
+// built and written in full, as when the program's output goes to a file.
+class DiscardedStandardOutput {
+ public:
+  DiscardedStandardOutput() : saved_(dup(STDOUT_FILENO)) {
+    std::fflush(stdout);
+    const int null = open("/dev/null", O_WRONLY);
+    dup2(null, STDOUT_FILENO);
+    close(null);
+  }
+  ~DiscardedStandardOutput() {
+    std::fflush(stdout);
+    dup2(saved_, STDOUT_FILENO);
+    close(saved_);
+  }
+  DiscardedStandardOutput(const DiscardedStandardOutput&) = delete;
+  DiscardedStandardOutput& operator=(const DiscardedStandardOutput&) = delete;
+
+ private:
+  int saved_;
+};
+
+// Ten minutes of a simulated drive, the metrics the store converts.
+const Corpus& corpus() {
+  static const Corpus* const drive = [] {
+    auto* built = new Corpus;
+    tarn::sim::Simulator simulator(kSeed, kStartMs);
+    for (const tarn::sim::TimedMetric& timed : simulator.advance(kDriveMs)) {
+      const store::Handler* handler = store::handlerFor(timed.metric.metricId);
+      if (handler == nullptr) continue;
+      built->handlers.push_back(handler);
+      built->payloads.push_back(timed.metric.payload);
+      built->records.push_back({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
+                                {"kKeyPayload", timed.metric.payload},
+                                {"kKeyProfileID", std::int64_t{1}},
+                                {"kKeyAppID", std::int64_t{2}}});
+    }
+    return built;
+  }();
+  return *drive;
+}
+
+void BM_DecodeAndDictionary(benchmark::State& state) {
+  const Corpus& metrics = corpus();
+  // The decoder logs the fields it consumes as metric-ID tags.
+  const DiscardedStandardOutput quiet;
+  for (auto _ : state) {
+    for (std::size_t i = 0; i < metrics.payloads.size(); ++i) {
+      benchmark::DoNotOptimize(metrics.handlers[i]->decode(&metrics.payloads[i]));
+    }
+  }
+  state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(metrics.payloads.size()));
+}
+BENCHMARK(BM_DecodeAndDictionary)->Unit(benchmark::kMillisecond);
+
+void BM_WholeIntake(benchmark::State& state) {
+  setenv("TZ", "Europe/Berlin", 1);
+  const Corpus& metrics = corpus();
+  MetricValidator intake(nullptr);
+  // The log lines are built in full and kept, not printed.
+  platform::log::Capture log;
+  for (auto _ : state) {
+    for (const platform::Dictionary& record : metrics.records)
+      intake.metricsDidUpdate(record);
+    log.clear();
+  }
+  state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(metrics.records.size()));
+}
+BENCHMARK(BM_WholeIntake)->Unit(benchmark::kMillisecond);
+
+}  // namespace
+
+BENCHMARK_MAIN();

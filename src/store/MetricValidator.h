@@ -1,0 +1,129 @@
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "client/TarnWrapperDelegate.h"
+#include "platform/Value.h"
+#include "store/DisplayDictionaries.h"
+#include "store/DisplayStore.h"
+#include "store/ListRecords.h"
+
+class TarnWrapper;
+
+namespace store {
+
+// The one receiver of the metrics the baseband delivers. It checks each metric's ID, decodes
+// the payload with the record class of that ID, converts it for display and keeps the latest
+// result of each kind for the screens. Everything runs on the main queue, so the store has no
+// lock.
+class MetricValidator : public TarnWrapperDelegate {
+ public:
+  // Metric IDs: 0x3C in bits 16 to 23, the metric's tag in the low 16 bits.
+  static constexpr std::int64_t K_LTE_CDRX_CONFIG = 0x3C4E18;
+  static constexpr std::int64_t K_LTE_RRC_STATE = 0x3C4E04;
+  static constexpr std::int64_t K_LTE_SCELL_INFO = 0x3C40C2;
+  static constexpr std::int64_t K_LTE_RLF = 0x3C4E25;
+  static constexpr std::int64_t K_LTE_SEL_RESEL_INFO = 0x3CD30E;
+  static constexpr std::int64_t K_LTE_SCELL_MEAS = 0x3CD301;
+  static constexpr std::int64_t K_LTE_TX_POWER = 0x3CD302;
+  static constexpr std::int64_t K_LTE_RSRP_RSRQ_SINR = 0x3C4F6A;
+  static constexpr std::int64_t K_LTE_COMPCARR_INFO = 0x3CD30B;
+  static constexpr std::int64_t K_LTE_CA_STATUS = 0x3CD313;
+  static constexpr std::int64_t K_LTE_INTERRAT_MEAS = 0x3CD310;
+  static constexpr std::int64_t K_LTE_INTRARAT_MEAS = 0x3CD30F;
+  static constexpr std::int64_t K_LTE_SECONDARYCELL_MEAS = 0x3CD317;
+  static constexpr std::int64_t K_CELLULAR_MM_INFO = 0x3CD509;
+  static constexpr std::int64_t K_CELLULAR_ACTIVE_BEARER = 0x3CD50D;
+  static constexpr std::int64_t K_LTE_EMM_CTXT = 0x3CD50C;
+  static constexpr std::int64_t K_CELLULAR_MM_CTXT = 0x3CD50A;
+  static constexpr std::int64_t K_CELLULAR_GMM_CTXT = 0x3CD50B;
+  static constexpr std::int64_t K_UMTS_RRC_STATE = 0x3CD112;
+  static constexpr std::int64_t K_UMTS_RRC_CONFIG = 0x3CD113;
+  static constexpr std::int64_t K_UMTS_SCELL_INFO = 0x3C300C;
+  static constexpr std::int64_t K_UMTS_SCELL_MEAS = 0x3CD102;
+  static constexpr std::int64_t K_UMTS_TX_POWER = 0x3CD103;
+  static constexpr std::int64_t K_UMTS_SEL_RESEL_INFO = 0x3CD104;
+  static constexpr std::int64_t K_UMTS_NCELL_MEAS = 0x3CD105;
+  static constexpr std::int64_t K_GSM_SCELL_INFO = 0x3C2E0C;
+  static constexpr std::int64_t K_GSM_IDLE_CONFIG = 0x3CD001;
+  static constexpr std::int64_t K_GSM_IDLE_SCELL_MEAS = 0x3CD002;
+  static constexpr std::int64_t K_GSM_CS_RF_MEAS = 0x3CD003;
+  static constexpr std::int64_t K_GSM_NCELL_MEAS = 0x3CD009;
+  static constexpr std::int64_t K_GSM_GPRS_CONFIG = 0x3CD00C;
+  static constexpr std::int64_t K_SIM_FILE_INFO = 0x3C0013;
+
+  // Keys of a metric record.
+  static constexpr std::string_view metricIDKey = "kKeyMetricID";
+  static constexpr std::string_view payloadKey = "kKeyPayload";
+  static constexpr std::string_view profileIDKey = "kKeyProfileID";
+
+  // The shared intake, created on first use: it listens on the shared session and is its
+  // delegate from then on.
+  static MetricValidator& sharedInstance();
+
+  // An empty store. With a session it calls the session's listen(); making it the session's
+  // delegate is the owner's part, since the session holds its delegate weakly.
+  explicit MetricValidator(TarnWrapper* session);
+
+  TarnWrapper* mySharedTarnInstance() const { return mySharedTarnInstance_; }
+
+  // The metric ID of the latest metric record handled; empty before the first and after one
+  // without an integer ID.
+  std::optional<std::int64_t> metricID() const { return metricID_; }
+  void setMetricID(std::optional<std::int64_t> metricID) { metricID_ = metricID; }
+
+  // The row list records. Assigning what a reader returns takes a snapshot.
+  const LTE& myLTE() const { return store_.myLTE; }
+  void setMyLTE(LTE lte) { store_.myLTE = std::move(lte); }
+  const UMTS& myUMTS() const { return store_.myUMTS; }
+  void setMyUMTS(UMTS umts) { store_.myUMTS = std::move(umts); }
+  const GSM& myGSM() const { return store_.myGSM; }
+  void setMyGSM(GSM gsm) { store_.myGSM = std::move(gsm); }
+  const Common& myCommon() const { return store_.myCommon; }
+  void setMyCommon(Common common) { store_.myCommon = std::move(common); }
+
+  // The 31 display dictionaries, e.g. myLTECAStatusDict() and setMyLTECAStatusDict(...); empty
+  // until the first metric of their kind.
+#define NORVO_DISPLAY_ACCESSORS(name)                                      \
+  const std::optional<platform::Dictionary>& my##name##Dict() const {      \
+    return store_[DisplayDictionary::name];                                \
+  }                                                                        \
+  void setMy##name##Dict(std::optional<platform::Dictionary> dictionary) { \
+    store_[DisplayDictionary::name] = std::move(dictionary);               \
+  }
+  NORVO_DISPLAY_DICTIONARIES(NORVO_DISPLAY_ACCESSORS)
+#undef NORVO_DISPLAY_ACCESSORS
+
+  const std::optional<platform::Dictionary>& displayDictionary(DisplayDictionary which) const {
+    return store_[which];
+  }
+
+  // LTE downlink bandwidth index to MHz.
+  const std::map<std::int32_t, float>& dlbwlookup() const;
+
+  // Validates, converts and stores one metric record; writes "Received Valid Metric" when it
+  // was.
+  void metricsDidUpdate(const platform::Dictionary& metric) override;
+  // Events are acknowledged and otherwise ignored.
+  void eventsDidUpdate(const platform::Dictionary& event) override;
+
+  // Reads the metric ID, and for one of the 30 IDs that have a handler decodes the payload,
+  // converts it and stores the result. False for any other ID, or when the payload does not
+  // decode; the store then keeps what it had.
+  virtual bool isMetricIDValidWithMetricdict(const platform::Dictionary& metric);
+
+  // "yyyy-MM-dd HH:mm:ss zzz" in the current time zone and locale; fractions of a second are
+  // dropped. Empty when the time cannot be shown as a date.
+  virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
+
+ private:
+  TarnWrapper* const mySharedTarnInstance_;
+  std::optional<std::int64_t> metricID_;
+  DisplayStore store_;
+};
+
+}  // namespace store

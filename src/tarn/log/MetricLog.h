@@ -1,0 +1,74 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <istream>
+#include <optional>
+#include <ostream>
+#include <string>
+#include <string_view>
+
+#include "platform/Value.h"
+
+// Metric logs: JSON Lines, one metric record per line, as docs/metric-log.md describes.
+//
+//   {"kKeyMetricID":3952132,"kKeyPayload":"CICw3vfTKxAD","kKeyProfileID":7,"kKeyAppID":2,"t_ms":250}
+namespace tarn::log {
+
+struct MetricLogEntry {
+  // The metric record as the session delivers it: "kKeyPayload" as bytes, the other keys as
+  // they stand in the line.
+  platform::Dictionary record;
+  // "t_ms": when the record was delivered, in milliseconds from the start of the log.
+  std::optional<std::int64_t> deliveryMs;
+};
+
+// A parsed line, or what is wrong with it.
+struct ParsedLine {
+  std::optional<MetricLogEntry> entry;
+  std::string error;
+};
+
+// Refuses a line that is no JSON object, whose "kKeyPayload" is no standard base64 text, or
+// whose "t_ms" is no integer of at least 0. Nothing else is checked here: a record without an
+// integer "kKeyMetricID" is the intake's to judge.
+ParsedLine parseMetricLogLine(std::string_view line);
+
+// The line for a record, without its newline; empty when the record has no integer
+// "kKeyMetricID" or no byte "kKeyPayload". Integer "kKeyProfileID" and "kKeyAppID" are kept,
+// other keys are not.
+std::optional<std::string> formatMetricLogLine(const platform::Dictionary& record,
+                                               std::optional<std::int64_t> deliveryMs = {});
+
+// Reads a log line by line. Blank lines are passed over; a line may end in CR LF.
+class MetricLogReader {
+ public:
+  struct Line {
+    std::size_t number;  // from 1
+    ParsedLine parsed;
+  };
+
+  explicit MetricLogReader(std::istream& input) : input_(input) {}
+
+  // The next line that is not blank; empty at the end of the input or when reading failed.
+  std::optional<Line> next();
+  // Whether the input ended in a read error rather than at its end.
+  bool failed() const { return input_.bad(); }
+
+ private:
+  std::istream& input_;
+  std::size_t lineNumber_ = 0;
+};
+
+class MetricLogWriter {
+ public:
+  explicit MetricLogWriter(std::ostream& output) : output_(output) {}
+
+  // False, writing nothing, for a record that formatMetricLogLine refuses.
+  bool write(const platform::Dictionary& record, std::optional<std::int64_t> deliveryMs = {});
+
+ private:
+  std::ostream& output_;
+};
+
+}  // namespace tarn::log

@@ -1,0 +1,97 @@
+#include "tarn/log/MetricLog.h"
+
+#include <gtest/gtest.h>
+
+#include <sstream>
+
+namespace tarn::log {
+namespace {
+
+using platform::Bytes;
+using platform::Dictionary;
+
+TEST(MetricLog, ReadsTheRecordWithItsPayloadAsBytesAndTheDeliveryTimeApart) {
+  const ParsedLine parsed = parseMetricLogLine(
+      R"({"kKeyMetricID":3952132,"kKeyPayload":"CAEQAg==","kKeyProfileID":7,"kKeyAppID":2,"t_ms":250})");
+  ASSERT_TRUE(parsed.entry) << parsed.error;
+  EXPECT_EQ(parsed.entry->record, (Dictionary{{"kKeyMetricID", std::int64_t{3952132}},
+                                              {"kKeyPayload", Bytes{0x08, 0x01, 0x10, 0x02}},
+                                              {"kKeyProfileID", std::int64_t{7}},
+                                              {"kKeyAppID", std::int64_t{2}}}));
+  EXPECT_EQ(parsed.entry->deliveryMs, 250);
+}
+
+TEST(MetricLog, LeavesJudgingTheMetricIDToTheIntake) {
+  const ParsedLine missing = parseMetricLogLine(R"({"kKeyPayload":""})");
+  ASSERT_TRUE(missing.entry);
+  EXPECT_EQ(missing.entry->record, (Dictionary{{"kKeyPayload", Bytes{}}}));
+
+  const ParsedLine text = parseMetricLogLine(R"({"kKeyMetricID":"3C4E04"})");
+  ASSERT_TRUE(text.entry);
+  EXPECT_EQ(*text.entry->record.find("kKeyMetricID"), platform::Value("3C4E04"));
+  EXPECT_FALSE(text.entry->deliveryMs);
+}
+
+TEST(MetricLog, RefusesLinesThatBreakTheFormatAndSaysWhy) {
+  EXPECT_NE(parseMetricLogLine(R"({"kKeyMetricID":3952132,)").error.find("not JSON"),
+            std::string::npos);
+  EXPECT_EQ(parseMetricLogLine("[1, 2]").error, "not a JSON object");
+  for (const char* line :
+       {R"({"kKeyMetricID":1,"kKeyPayload":"CAE"})", R"({"kKeyMetricID":1,"kKeyPayload":"CA E="})",
+        R"({"kKeyMetricID":1,"kKeyPayload":8})"}) {
+    const ParsedLine parsed = parseMetricLogLine(line);
+    EXPECT_FALSE(parsed.entry) << line;
+    EXPECT_EQ(parsed.error, "\"kKeyPayload\" is not standard base64 text") << line;
+  }
+  for (const char* line : {R"({"kKeyMetricID":1,"t_ms":-1})", R"({"kKeyMetricID":1,"t_ms":"soon"})",
+                           R"({"kKeyMetricID":1,"t_ms":2.5})"}) {
+    EXPECT_FALSE(parseMetricLogLine(line).entry) << line;
+  }
+}
+
+TEST(MetricLog, WritesWhatItReadsBack) {
+  std::stringstream log;
+  MetricLogWriter writer(log);
+  const Dictionary record{{"kKeyMetricID", std::int64_t{0x3CD313}},
+                          {"kKeyPayload", Bytes{0x08, 0xFF, 0x01}},
+                          {"kKeyProfileID", std::int64_t{-1}},
+                          {"kKeyAppID", std::int64_t{2}}};
+  ASSERT_TRUE(writer.write(record, 1500));
+  ASSERT_TRUE(writer.write(Dictionary{{"kKeyMetricID", 19}, {"kKeyPayload", Bytes{}}}));
+  EXPECT_EQ(log.str(),
+            "{\"kKeyMetricID\":3986195,\"kKeyPayload\":\"CP8B\",\"kKeyProfileID\":-1,"
+            "\"kKeyAppID\":2,\"t_ms\":1500}\n"
+            "{\"kKeyMetricID\":19,\"kKeyPayload\":\"\"}\n");
+
+  MetricLogReader reader(log);
+  const auto first = reader.next();
+  ASSERT_TRUE(first && first->parsed.entry);
+  EXPECT_EQ(first->parsed.entry->record, record);
+  EXPECT_EQ(first->parsed.entry->deliveryMs, 1500);
+}
+
+TEST(MetricLog, WritesNothingForARecordWithoutIntegerIDOrBytePayload) {
+  std::stringstream log;
+  MetricLogWriter writer(log);
+  EXPECT_FALSE(writer.write(Dictionary{{"kKeyPayload", Bytes{1}}}));
+  EXPECT_FALSE(writer.write(Dictionary{{"kKeyMetricID", "1"}, {"kKeyPayload", Bytes{1}}}));
+  EXPECT_FALSE(writer.write(Dictionary{{"kKeyMetricID", 1}, {"kKeyPayload", "AQ=="}}));
+  EXPECT_EQ(log.str(), "");
+}
+
+TEST(MetricLog, CountsEveryLineButPassesOverBlankOnes) {
+  std::istringstream log("{\"kKeyMetricID\":1}\r\n\n   \nnonsense\n{\"kKeyMetricID\":2}");
+  MetricLogReader reader(log);
+  std::vector<std::size_t> numbers;
+  std::vector<bool> parsed;
+  while (const auto line = reader.next()) {
+    numbers.push_back(line->number);
+    parsed.push_back(line->parsed.entry.has_value());
+  }
+  EXPECT_EQ(numbers, (std::vector<std::size_t>{1, 4, 5}));
+  EXPECT_EQ(parsed, (std::vector<bool>{true, false, true}));
+  EXPECT_FALSE(reader.failed());
+}
+
+}  // namespace
+}  // namespace tarn::log

@@ -14,6 +14,7 @@ all: build
 
 deps:
 	@tools/install-deps.sh
+	@test -d tests/browser/node_modules || (cd tests/browser && npm ci --no-audit --no-fund)
 
 build: deps
 	@$(call configure,$(BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo)
@@ -37,8 +38,10 @@ asan-test: build-asan
 bench: build
 	cmake --build $(BUILD) --target bench
 
+# Norvo with its built-in baseband service and simulated phone; ARGS="--listen 0.0.0.0:8080"
+# shows the pages to the network. Ctrl-C stops it.
 run: build
-	$(BUILD)/tools/decode/norvo-decode KCellularLteRrcState 0880b0def7d32b1003180120ee282804
+	$(BUILD)/src/app/norvo $(ARGS)
 
 format:
 	git ls-files '*.h' '*.cc' | xargs clang-format -i

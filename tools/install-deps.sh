@@ -9,6 +9,7 @@ packages=(
   libboost1.81-dev libboost-json1.81-dev
   libsdbus-c++-dev libicu-dev
   libgtest-dev libgmock-dev libbenchmark-dev
+  chromium nodejs
 )
 
 missing=()
@@ -16,6 +17,8 @@ for package in "${packages[@]}"; do
   status=$(dpkg-query -W -f='${Status}' "$package" 2>/dev/null || true)
   [[ "$status" == "install ok installed" ]] || missing+=("$package")
 done
+# Some Node.js builds bring npm along; Debian's packages it on its own.
+command -v npm > /dev/null 2>&1 || missing+=(npm)
 [[ ${#missing[@]} -eq 0 ]] && exit 0
 
 echo "Installing missing packages: ${missing[*]}"

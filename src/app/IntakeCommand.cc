@@ -1,0 +1,154 @@
+#include "app/IntakeCommand.h"
+
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <iostream>
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "platform/Json.h"
+#include "platform/MainQueue.h"
+#include "store/MetricValidator.h"
+#include "store/StoreDump.h"
+#include "tarn/client/Transport.h"
+#include "tarn/log/MetricLog.h"
+#include "tarn/service/Core.h"
+#include "tarn/transport/InProcess.h"
+
+namespace app {
+
+namespace {
+
+constexpr std::string_view kUsage =
+    "usage: norvo intake LOG.jsonl [--dump-store OUT.json]\n"
+    "\n"
+    "Hands each metric record of LOG.jsonl (\"-\" for standard input) to the metric intake, in\n"
+    "order, and prints the intake's log lines. With --dump-store, writes the whole store to\n"
+    "OUT.json afterwards. Lines that do not parse are reported and skipped.\n";
+
+struct Options {
+  std::string logPath;
+  std::optional<std::string> dumpPath;
+};
+
+// Empty, after saying why on standard error, when the arguments make no sense.
+std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
+  Options options;
+  bool haveLog = false;
+  for (std::size_t i = 0; i < arguments.size(); ++i) {
+    const std::string_view argument = arguments[i];
+    if (argument == "--dump-store") {
+      if (i + 1 == arguments.size()) {
+        std::cerr << "norvo intake: --dump-store needs a file name\n";
+        return std::nullopt;
+      }
+      options.dumpPath = std::string(arguments[++i]);
+    } else if (argument.size() > 1 && argument.front() == '-') {
+      std::cerr << "norvo intake: unknown option " << argument << '\n';
+      return std::nullopt;
+    } else if (haveLog) {
+      std::cerr << "norvo intake: one metric log at a time, not also " << argument << '\n';
+      return std::nullopt;
+    } else {
+      options.logPath = std::string(argument);
+      haveLog = true;
+    }
+  }
+  if (!haveLog) {
+    std::cerr << "norvo intake: which metric log? (\"-\" for standard input)\n";
+    return std::nullopt;
+  }
+  return options;
+}
+
+// Only the log's records may reach the store: sessions opened from now on reach a service in
+// this process that has no metric source.
+void useSilentService() {
+  tarn::client::useTransport(
+      std::make_shared<tarn::transport::InProcess>(std::make_shared<tarn::service::Core>()));
+}
+
+bool writeDump(std::ofstream& file, const store::MetricValidator& intake) {
+  file << platform::toJson(store::dumpStore(intake)) << '\n';
+  file.close();
+  return !file.fail();
+}
+
+}  // namespace
+
+bool deliverMetricLog(std::istream& log, std::string_view logName, TarnWrapperDelegate& receiver,
+                      std::ostream& errors) {
+  tarn::log::MetricLogReader reader(log);
+  std::function<void()> deliverNext;
+  deliverNext = [&] {
+    std::optional<tarn::log::MetricLogReader::Line> line = reader.next();
+    if (!line) {
+      platform::stopMainQueue();
+      return;
+    }
+    if (line->parsed.entry) {
+      receiver.metricsDidUpdate(line->parsed.entry->record);
+    } else {
+      // Keeps the report next to the intake's lines when both streams go to one place.
+      std::fflush(stdout);
+      errors << logName << ':' << line->number << ": " << line->parsed.error << "; line skipped"
+             << std::endl;
+    }
+    platform::postToMainQueue(deliverNext);
+  };
+  platform::postToMainQueue(deliverNext);
+  platform::runMainQueue();
+  return !reader.failed();
+}
+
+int runIntakeCommand(std::span<const std::string_view> arguments) {
+  for (const std::string_view argument : arguments) {
+    if (argument == "--help" || argument == "-h") {
+      std::cout << kUsage;
+      return 0;
+    }
+  }
+  const std::optional<Options> options = parseOptions(arguments);
+  if (!options) {
+    std::cerr << kUsage;
+    return 2;
+  }
+
+  std::ifstream file;
+  if (options->logPath != "-") {
+    file.open(options->logPath, std::ios::binary);
+    if (!file) {
+      std::cerr << "norvo intake: cannot read " << options->logPath << '\n';
+      return 1;
+    }
+  }
+  std::istream& log = options->logPath == "-" ? std::cin : file;
+  const std::string logName = options->logPath == "-" ? "<stdin>" : options->logPath;
+  // Opened first, so that a long log is not read in vain.
+  std::ofstream dump;
+  if (options->dumpPath) {
+    dump.open(*options->dumpPath, std::ios::binary | std::ios::trunc);
+    if (!dump) {
+      std::cerr << "norvo intake: cannot write the store to " << *options->dumpPath << '\n';
+      return 1;
+    }
+  }
+
+  useSilentService();
+  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
+  const bool read = deliverMetricLog(log, logName, intake, std::cerr);
+  std::fflush(stdout);
+  if (!read) {
+    std::cerr << "norvo intake: cannot read " << logName << " to its end\n";
+    return 1;
+  }
+  if (options->dumpPath && !writeDump(dump, intake)) {
+    std::cerr << "norvo intake: cannot write the store to " << *options->dumpPath << '\n';
+    return 1;
+  }
+  return 0;
+}
+
+}  // namespace app

@@ -1,0 +1,46 @@
+#include <iostream>
+#include <span>
+#include <string_view>
+#include <vector>
+
+#include "app/IntakeCommand.h"
+#include "app/Viewer.h"
+
+namespace {
+
+struct Command {
+  std::string_view name;
+  int (*run)(std::span<const std::string_view> arguments);
+};
+
+constexpr Command kCommands[] = {
+    {"intake", &app::runIntakeCommand},
+};
+
+constexpr std::string_view kCommandsUsage =
+    "\n"
+    "usage: norvo <command> [arguments]\n"
+    "\n"
+    "commands:\n"
+    "  intake LOG.jsonl [--dump-store OUT.json]\n"
+    "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
+    "\n"
+    "norvo <command> --help describes a command.\n";
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  const std::vector<std::string_view> arguments(argv + 1, argv + argc);
+  const std::string_view name = arguments.empty() ? "" : arguments.front();
+  if (name == "--help" || name == "-h" || name == "help") {
+    std::cout << app::kViewerUsage << kCommandsUsage;
+    return 0;
+  }
+  // Without a command, Norvo is the viewer.
+  if (arguments.empty() || name.starts_with("--")) return app::runViewer(arguments);
+  for (const Command& command : kCommands) {
+    if (command.name == name) return command.run(std::span(arguments).subspan(1));
+  }
+  std::cerr << "norvo: unknown command " << name << "\n\n" << app::kViewerUsage << kCommandsUsage;
+  return 2;
+}

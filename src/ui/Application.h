@@ -1,0 +1,43 @@
+#pragma once
+
+#include <boost/asio/ip/tcp.hpp>
+#include <memory>
+#include <optional>
+
+#include "platform/Value.h"
+#include "ui/Storyboard.h"
+#include "ui/Window.h"
+#include "ui/web/Site.h"
+
+namespace ui {
+
+// What the running application tells the app.
+class ApplicationDelegate {
+ public:
+  virtual ~ApplicationDelegate() = default;
+
+  // The window made from the interface description; the delegate holds it.
+  virtual std::shared_ptr<Window> window() const = 0;
+  virtual void setWindow(std::shared_ptr<Window> window) = 0;
+
+  // Once the window exists, before it is shown. No launch options are ever passed here.
+  virtual bool didFinishLaunchingWithOptions(
+      const std::optional<platform::Dictionary>& launchOptions) = 0;
+  // When the application is asked to stop (Ctrl-C or SIGTERM).
+  virtual void applicationWillTerminate() {}
+};
+
+struct DisplayOptions {
+  boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
+  // Extra JSON readings under /api/<name>.
+  std::map<std::string, web::Site::Reading, std::less<>> readings;
+};
+
+// Runs the application on the main queue until it is asked to stop: makes the window and its
+// root from `mainInterface`, hands the window to `delegate`, shows it, and serves its screens to
+// browsers at `display.listen` (each address a screen, see web/Site.h). Answers the process's
+// exit status: 0 after a stop, 1 when the address cannot be listened on.
+int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterface,
+                    DisplayOptions display);
+
+}  // namespace ui

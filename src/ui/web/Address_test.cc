@@ -1,0 +1,32 @@
+#include "ui/web/Address.h"
+
+#include <gtest/gtest.h>
+
+namespace ui::web {
+namespace {
+
+TEST(AnAddress, NamesTheTextsOfTheRowsTappedFromTheRoot) {
+  EXPECT_EQ(decodePath("/"), Path{});
+  EXPECT_EQ(decodePath("/LTE/CA%20Status"), (Path{"LTE", "CA Status"}));
+  EXPECT_EQ(decodePath("/LTE/CA%20Status/"), (Path{"LTE", "CA Status"}));
+  EXPECT_EQ(decodePath("/a%2Fb"), Path{"a/b"});
+  EXPECT_EQ(decodePath("/caf%C3%a9+x"), Path{"caf\xC3\xA9+x"});
+}
+
+TEST(AnAddress, IsRefusedWhenItIsNotAPathOrHasAnEmptyOrBrokenSegment) {
+  for (const char* address : {"", "LTE", "//", "/LTE//x", "/%", "/%2", "/%zz", "/ab%2"})
+    EXPECT_EQ(decodePath(address), std::nullopt) << address;
+}
+
+TEST(AnAddress, EscapesEverythingButUnreservedCharactersAndRoundTrips) {
+  const Path path{"Sel Resel/Parameters", "C-DRX_1.0~", "\"<x>&'?#%", std::string("\0\xFF", 2)};
+  const std::string address = encodePath(path);
+  EXPECT_EQ(address, "/Sel%20Resel%2FParameters/C-DRX_1.0~/%22%3Cx%3E%26%27%3F%23%25/%00%FF");
+  EXPECT_EQ(decodePath(address), path);
+  EXPECT_EQ(encodePath({}), "/");
+  EXPECT_EQ(appendToAddress("/", "LTE"), "/LTE");
+  EXPECT_EQ(appendToAddress("/LTE", "CA Status"), "/LTE/CA%20Status");
+}
+
+}  // namespace
+}  // namespace ui::web

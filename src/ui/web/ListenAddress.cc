@@ -1,0 +1,43 @@
+#include "ui/web/ListenAddress.h"
+
+#include <charconv>
+#include <cstdint>
+
+namespace ui::web {
+
+std::optional<boost::asio::ip::tcp::endpoint> parseListenAddress(std::string_view text) {
+  const std::size_t colon = text.rfind(':');
+  if (colon == std::string_view::npos) return std::nullopt;
+  std::string_view host = text.substr(0, colon);
+  const std::string_view portText = text.substr(colon + 1);
+
+  std::uint16_t port = 0;
+  const auto [end, error] =
+      std::from_chars(portText.data(), portText.data() + portText.size(), port);
+  if (portText.empty() || error != std::errc() || end != portText.data() + portText.size())
+    return std::nullopt;
+
+  if (host.size() >= 2 && host.front() == '[' && host.back() == ']')
+    host = host.substr(1, host.size() - 2);
+  else if (host.find(':') != std::string_view::npos)
+    return std::nullopt;  // an IPv6 address needs its brackets, or its end is not clear
+  if (host == "localhost") host = "127.0.0.1";
+  boost::system::error_code invalid;
+  const auto address = boost::asio::ip::make_address(std::string(host), invalid);
+  if (invalid) return std::nullopt;
+  return boost::asio::ip::tcp::endpoint(address, port);
+}
+
+std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint) {
+  const auto address = endpoint.address();
+  std::string host;
+  if (address.is_unspecified())
+    host = address.is_v6() ? "[::1]" : "127.0.0.1";
+  else if (address.is_v6())
+    host = "[" + address.to_string() + "]";
+  else
+    host = address.to_string();
+  return "http://" + host + ":" + std::to_string(endpoint.port()) + "/";
+}
+
+}  // namespace ui::web

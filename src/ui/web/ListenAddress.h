@@ -1,0 +1,17 @@
+#pragma once
+
+#include <boost/asio/ip/tcp.hpp>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace ui::web {
+
+// "127.0.0.1:8080", "0.0.0.0:80", "[::1]:8080" (IPv6 in brackets) or "localhost:8080"; the port
+// may be 0 (any free port). Empty for anything else.
+std::optional<boost::asio::ip::tcp::endpoint> parseListenAddress(std::string_view text);
+
+// The address a browser opens to reach `endpoint`, e.g. "http://127.0.0.1:8080/".
+std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint);
+
+}  // namespace ui::web

@@ -1,0 +1,128 @@
+#include "ui/web/Site.h"
+
+#include <boost/asio/ip/address.hpp>
+#include <boost/beast/core/string.hpp>
+#include <boost/beast/http/field.hpp>
+#include <exception>
+
+#include "platform/Log.h"
+#include "ui/web/Assets.h"
+#include "ui/web/PageHtml.h"
+#include "ui/web/PageJson.h"
+#include "ui/web/PageView.h"
+#include "ui/web/Responses.h"
+
+namespace ui::web {
+
+namespace {
+
+constexpr std::size_t kMaxTarget = 2048;
+constexpr std::string_view kScreensApi = "/api/screens";
+constexpr std::string_view kApi = "/api/";
+constexpr std::string_view kAssets = "/assets/";
+
+ErrorFormat formatFor(std::string_view path) {
+  return path.starts_with(kApi) || path == kScreensApi ? ErrorFormat::Json : ErrorFormat::Html;
+}
+
+Response error(const Request& request, http::status status, ErrorFormat format) {
+  return errorResponse(status, format, request.version(), request.keep_alive());
+}
+
+// "localhost", "127.0.0.1:8080", "[::1]:8080" and the like.
+bool isLoopbackHost(std::string_view host) {
+  if (host.starts_with('[')) {
+    const std::size_t close = host.find(']');
+    if (close == std::string_view::npos) return false;
+    host = host.substr(1, close - 1);
+  } else if (const std::size_t colon = host.rfind(':'); colon != std::string_view::npos) {
+    host = host.substr(0, colon);
+  }
+  if (boost::beast::iequals(host, "localhost")) return true;
+  boost::system::error_code invalid;
+  const auto address = boost::asio::ip::make_address(std::string(host), invalid);
+  return !invalid && address.is_loopback();
+}
+
+}  // namespace
+
+Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {}
+
+Response Site::handle(const Request& request) {
+  const std::string_view target = request.target();
+  const std::string_view path = target.substr(0, target.find('?'));
+  try {
+    Response response = route(request, path);
+    if (request.method() == http::verb::head) {
+      const std::size_t length = response.body().size();
+      response.body().clear();
+      response.content_length(length);
+    }
+    return response;
+  } catch (const std::exception& failure) {
+    platform::log::plainf("Could not answer %s: %s", std::string(path), failure.what());
+    return error(request, http::status::internal_server_error, formatFor(path));
+  }
+}
+
+Response Site::route(const Request& request, std::string_view path) {
+  if (request.method() != http::verb::get && request.method() != http::verb::head)
+    return error(request, http::status::method_not_allowed, formatFor(path));
+  if (!hostAllowed(request))
+    return error(request, http::status::misdirected_request, formatFor(path));
+  if (request.target().size() > kMaxTarget)
+    return error(request, http::status::uri_too_long, formatFor(path));
+  if (!path.starts_with('/')) return error(request, http::status::bad_request, ErrorFormat::Html);
+
+  if (path.starts_with(kAssets)) return asset(request, path.substr(kAssets.size()));
+  if (path == kScreensApi) return screenPage(request, "/", true);
+  if (path.starts_with(kScreensApi) && path[kScreensApi.size()] == '/')
+    return screenPage(request, path.substr(kScreensApi.size()), true);
+  if (path.starts_with(kApi)) return reading(request, path.substr(kApi.size()));
+  return screenPage(request, path, false);
+}
+
+Response Site::screenPage(const Request& request, std::string_view path, bool json) {
+  const ErrorFormat format = json ? ErrorFormat::Json : ErrorFormat::Html;
+  const std::optional<Path> rows = decodePath(path);
+  if (!rows) return error(request, http::status::bad_request, format);
+  Page* page = pages_.open(*rows, OpenPages::Clock::now());
+  if (page == nullptr) return error(request, http::status::not_found, format);
+
+  const PageView view = describe(*page);
+  if (json)
+    return makeResponse(http::status::ok, "application/json", renderJson(view), request.version(),
+                        request.keep_alive());
+  return makeResponse(http::status::ok, "text/html; charset=utf-8", renderHtml(view),
+                      request.version(), request.keep_alive());
+}
+
+Response Site::asset(const Request& request, std::string_view name) {
+  const Asset* found = findAsset(name);
+  if (found == nullptr) return error(request, http::status::not_found, ErrorFormat::Html);
+  const bool unchanged = request[http::field::if_none_match] == found->etag;
+  Response response =
+      makeResponse(unchanged ? http::status::not_modified : http::status::ok, found->contentType,
+                   unchanged ? std::string() : std::string(found->content), request.version(),
+                   request.keep_alive());
+  response.set(http::field::cache_control, "no-cache");
+  response.set(http::field::etag, found->etag);
+  return response;
+}
+
+Response Site::reading(const Request& request, std::string_view name) {
+  const auto found = options_.readings.find(name);
+  if (found == options_.readings.end())
+    return error(request, http::status::not_found, ErrorFormat::Json);
+  return makeResponse(http::status::ok, "application/json", found->second(), request.version(),
+                      request.keep_alive());
+}
+
+bool Site::hostAllowed(const Request& request) const {
+  if (options_.anyHost) return true;
+  const auto host = request.find(http::field::host);
+  // Clients of HTTP/1.0 may leave the host out; browsers always name one.
+  return host == request.end() || isLoopbackHost(host->value());
+}
+
+}  // namespace ui::web

@@ -57,6 +57,17 @@ TEST_F(LteReselectionTest, KeepsTheNumericTimestampAndShowsTheBandsAsText) {
   EXPECT_THAT(log.plainLines(), ::testing::Contains("[3, 7]"));
 }
 
+// Logged as decoded: numeric timestamp and the bands still a list; the band text follows alone.
+TEST_F(LteReselectionTest, LogsBeforeTheBandsBecomeText) {
+  deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 5));
+  Dictionary logged = *validator.myLTESelReselDict();
+  logged.set("multi_band_info", List{3u, 7u});
+  EXPECT_THAT(log.plainLines(),
+              ::testing::ElementsAre("Metric ID in Hex = 3CD30E",
+                                     "Received LTE Cell Resel Info is " + logged.description(),
+                                     "[3, 7]", "Received Valid Metric"));
+}
+
 TEST_F(LteReselectionTest, RefreshesItsFixedKeysOneByOne) {
   deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 5));
   const Dictionary& copy = validator.myLTE().SelReselCellInfo;

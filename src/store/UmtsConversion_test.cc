@@ -106,6 +106,21 @@ TEST_F(UmtsReselectionTest, RefreshesItsFixedKeysWithTextTimestampAndBands) {
   EXPECT_EQ(*validator.myUMTSSelReselDict()->find("timestamp"), Value(kJuly14Text));
 }
 
+// Logged after the timestamp became text but before the bands do; the band text follows alone.
+TEST_F(UmtsReselectionTest, LogsBetweenTheTimestampAndTheBandText) {
+  KCellularWcdmaSelReselCellInfo info = reselection();
+  info.addMultiBandInfo(1);
+  info.addMultiBandInfo(8);
+  deliver(V::K_UMTS_SEL_RESEL_INFO, info);
+  Dictionary logged = *validator.myUMTSSelReselDict();
+  EXPECT_EQ(*logged.find("timestamp"), Value(kJuly14Text));
+  logged.set("multi_band_info", List{1u, 8u});
+  EXPECT_THAT(log.plainLines(),
+              ::testing::ElementsAre("Metric ID in Hex = 3CD104",
+                                     "Received UMTS Cell Resel Info is " + logged.description(),
+                                     "[1, 8]", "Received Valid Metric"));
+}
+
 TEST_F(UmtsReselectionTest, FillsOnlyThePriorityListsTheMetricCarries) {
   deliver(V::K_UMTS_SEL_RESEL_INFO, reselection());
   const UMTS& umts = validator.myUMTS();

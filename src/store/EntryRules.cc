@@ -66,12 +66,11 @@ std::optional<Value> apply(EntryRule rule, const Value& entry,
     case EntryRule::SinrHalfDb:
       return floatResult(entry, [](double sinr) { return sinr * 0.5; });
     case EntryRule::BandwidthCode: {
-      const std::optional<std::int64_t> code = entry.asInteger();
+      // Codes are read as 32-bit integers; anything else is not a code and stays as it is.
+      const std::optional<std::int32_t> code = entry.asInt32();
       if (!code) return std::nullopt;
       const auto& table = downlinkBandwidthMHz();
-      const auto found = std::in_range<std::int32_t>(*code)
-                             ? table.find(static_cast<std::int32_t>(*code))
-                             : table.end();
+      const auto found = table.find(*code);
       return found == table.end() ? Value() : Value(found->second);
     }
     case EntryRule::HalvedBandwidth:

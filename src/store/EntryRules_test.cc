@@ -37,12 +37,17 @@ TEST(EntryRules, LeaveEntriesOfAnotherTypeAsTheyAre) {
   EXPECT_EQ(converted(fraction, {"dl_bw", EntryRule::RxLevIndex}), fraction);
 }
 
-TEST(EntryRules, DropEveryIntegerBandwidthCodeOutsideTheTable) {
-  for (const Value& code :
-       {Value(-1), Value(6), Value(std::uint32_t{4294967295u}), Value(std::int64_t{1} << 40)}) {
+TEST(EntryRules, DropEveryBandwidthCodeOutsideTheTableButKeepWhatIsNoCode) {
+  for (const Value& code : {Value(-1), Value(6), Value(std::int64_t{9})}) {
     EXPECT_EQ(converted({{"dl_bw", code}, {"earfcn", 300}}, {"dl_bw", EntryRule::BandwidthCode}),
               (Dictionary{{"earfcn", 300}}))
         << code.description();
+  }
+  for (const Value& notACode :
+       {Value(std::uint32_t{4294967295u}), Value(std::int64_t{1} << 40), Value("3")}) {
+    EXPECT_EQ(converted({{"dl_bw", notACode}}, {"dl_bw", EntryRule::BandwidthCode}),
+              (Dictionary{{"dl_bw", notACode}}))
+        << notACode.description();
   }
   EXPECT_EQ(converted({{"dl_bw", 0}}, {"dl_bw", EntryRule::BandwidthCode}),
             (Dictionary{{"dl_bw", 1.4f}}));

@@ -2,13 +2,18 @@
 
 #include <iostream>
 #include <memory>
+#include <optional>
+#include <stdexcept>
+#include <string>
 
 #include "app/AppDelegate.h"
 #include "app/MainInterface.h"
+#include "app/SpeedOption.h"
 #include "platform/Json.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
 #include "tarn/client/Transport.h"
+#include "tarn/replay/ReplaySource.h"
 #include "tarn/service/Core.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "tarn/transport/InProcess.h"
@@ -18,44 +23,107 @@
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT]\n"
+    "usage: norvo [--listen ADDR:PORT] [--replay LOG.jsonl [--speed X] [--loop]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
     "neighbour cells, carrier aggregation, NAS state, bearers and SIM files. The metrics come\n"
-    "from the simulated phone of the baseband service built into Norvo.\n"
+    "from the simulated phone of the baseband service built into Norvo, or from a metric log.\n"
     "\n"
     "options:\n"
     "  --listen ADDR:PORT  where to serve the pages (default 127.0.0.1:8080). Only loopback\n"
     "                      addresses are private; 0.0.0.0:8080 shows the pages to the whole\n"
     "                      network. Port 0 takes any free port.\n"
+    "  --replay LOG.jsonl  replay a metric log (see norvo record) instead of simulating; lines\n"
+    "                      that do not parse are reported and skipped\n"
+    "  --speed X           replay X times as fast as recorded (default 1), or \"max\" for\n"
+    "                      no pauses at all\n"
+    "  --loop              start the log over after its last metric\n"
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
     "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON and\n"
     "/api/store answers the whole store.\n";
 
-int runViewer(std::span<const std::string_view> arguments) {
-  ui::DisplayOptions display;
-  for (std::size_t i = 0; i < arguments.size(); ++i) {
-    if (arguments[i] != "--listen") {
-      std::cerr << "norvo: unknown option " << arguments[i] << "\n\n" << kViewerUsage;
-      return 2;
-    }
-    const auto endpoint =
-        i + 1 < arguments.size() ? ui::web::parseListenAddress(arguments[++i]) : std::nullopt;
-    if (!endpoint) {
-      std::cerr << "norvo: --listen wants an address and a port, such as 127.0.0.1:8080\n";
-      return 2;
-    }
-    display.listen = *endpoint;
-  }
+namespace {
 
-  // The same drive every run, so that what one user sees another can reproduce.
-  constexpr std::uint64_t kDriveSeed = 1;
-  auto service = std::make_shared<tarn::service::Core>(
-      std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed));
+struct ViewerOptions {
+  ui::DisplayOptions display;
+  std::optional<std::string> replayPath;
+  tarn::replay::ReplayOptions replay;
+  bool replayTuned = false;  // --speed or --loop given
+};
+
+// Empty, after saying why on standard error, when the arguments make no sense.
+std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
+  ViewerOptions options;
+  for (std::size_t i = 0; i < arguments.size(); ++i) {
+    const std::string_view argument = arguments[i];
+    const std::optional<std::string_view> value =
+        i + 1 < arguments.size() ? std::optional(arguments[i + 1]) : std::nullopt;
+    if (argument == "--listen") {
+      const auto endpoint = value ? ui::web::parseListenAddress(*value) : std::nullopt;
+      if (!endpoint) {
+        std::cerr << "norvo: --listen wants an address and a port, such as 127.0.0.1:8080\n";
+        return std::nullopt;
+      }
+      options.display.listen = *endpoint;
+      ++i;
+    } else if (argument == "--replay") {
+      if (!value) {
+        std::cerr << "norvo: --replay needs a metric log\n";
+        return std::nullopt;
+      }
+      options.replayPath = std::string(*value);
+      ++i;
+    } else if (argument == "--speed") {
+      const bool asFastAsPossible = value == "max";
+      const auto speed = value && !asFastAsPossible ? parseSpeedFactor(*value) : std::nullopt;
+      if (!speed && !asFastAsPossible) {
+        std::cerr << "norvo: --speed wants a number above 0 or \"max\"\n";
+        return std::nullopt;
+      }
+      options.replay.speed = speed;
+      options.replayTuned = true;
+      ++i;
+    } else if (argument == "--loop") {
+      options.replay.loop = true;
+      options.replayTuned = true;
+    } else {
+      std::cerr << "norvo: unknown option " << argument << "\n\n" << kViewerUsage;
+      return std::nullopt;
+    }
+  }
+  if (options.replayTuned && !options.replayPath) {
+    std::cerr << "norvo: --speed and --loop go with --replay\n";
+    return std::nullopt;
+  }
+  return options;
+}
+
+}  // namespace
+
+int runViewer(std::span<const std::string_view> arguments) {
+  std::optional<ViewerOptions> options = parseOptions(arguments);
+  if (!options) return 2;
+
+  std::shared_ptr<tarn::service::MetricSource> source;
+  if (options->replayPath) {
+    try {
+      source = std::make_shared<tarn::replay::ReplaySource>(*options->replayPath, options->replay,
+                                                            std::cerr);
+    } catch (const std::runtime_error& error) {
+      std::cerr << "norvo: " << error.what() << '\n';
+      return 1;
+    }
+  } else {
+    // The same drive every run, so that what one user sees another can reproduce.
+    constexpr std::uint64_t kDriveSeed = 1;
+    source = std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed);
+  }
+  auto service = std::make_shared<tarn::service::Core>(std::move(source));
   tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(service));
 
+  ui::DisplayOptions display = std::move(options->display);
   display.readings.emplace("store", [] {
     return platform::toJson(store::dumpStore(store::MetricValidator::sharedInstance()));
   });

@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "app/IntakeCommand.h"
+#include "app/RecordCommand.h"
 #include "app/Viewer.h"
 
 namespace {
@@ -15,6 +16,7 @@ struct Command {
 
 constexpr Command kCommands[] = {
     {"intake", &app::runIntakeCommand},
+    {"record", &app::runRecordCommand},
 };
 
 constexpr std::string_view kCommandsUsage =
@@ -24,6 +26,8 @@ constexpr std::string_view kCommandsUsage =
     "commands:\n"
     "  intake LOG.jsonl [--dump-store OUT.json]\n"
     "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
+    "  record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"
+    "      Record the metrics the simulated phone delivers into a metric log, for --replay.\n"
     "\n"
     "norvo <command> --help describes a command.\n";
 

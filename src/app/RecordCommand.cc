@@ -1,0 +1,177 @@
+#include "app/RecordCommand.h"
+
+#include <boost/asio/signal_set.hpp>
+#include <boost/asio/steady_timer.hpp>
+#include <charconv>
+#include <csignal>
+#include <fstream>
+#include <iostream>
+
+#include "app/SpeedOption.h"
+#include "client/TarnWrapper.h"
+#include "platform/MainQueue.h"
+#include "tarn/client/Transport.h"
+#include "tarn/service/Core.h"
+#include "tarn/sim/SimulatorSource.h"
+#include "tarn/transport/InProcess.h"
+#include "ui/Bundle.h"
+
+namespace app {
+
+namespace {
+
+constexpr std::string_view kUsage =
+    "usage: norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"
+    "\n"
+    "Runs the simulated phone, subscribes to its metrics as the viewer does and writes every\n"
+    "metric delivered to OUT.jsonl as a metric log, with \"t_ms\" counted from the start, until N\n"
+    "seconds have passed or Ctrl-C. --seed chooses the drive (default 1, the viewer's), --speed\n"
+    "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n";
+
+// As the app asks for the SIM files at start.
+constexpr std::int32_t kSimQueryTriggerRef = 9999;
+constexpr std::int32_t kSimQueryTriggerID = 0x7F0013;
+
+struct Options {
+  std::string outPath;
+  SimulatorRun run;
+};
+
+template <class Number>
+std::optional<Number> parseNumber(std::string_view text) {
+  Number number{};
+  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+  if (error != std::errc() || end != text.data() + text.size()) return std::nullopt;
+  return number;
+}
+
+// Empty, after saying why on standard error, when the arguments make no sense.
+std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
+  Options options;
+  bool haveOut = false;
+  for (std::size_t i = 0; i < arguments.size(); ++i) {
+    const std::string_view argument = arguments[i];
+    const bool takesValue =
+        argument == "--seconds" || argument == "--seed" || argument == "--speed";
+    if (takesValue && i + 1 == arguments.size()) {
+      std::cerr << "norvo record: " << argument << " needs a value\n";
+      return std::nullopt;
+    }
+    if (argument == "--seconds") {
+      const auto seconds = parseNumber<std::uint32_t>(arguments[++i]);
+      if (!seconds || *seconds == 0) {
+        std::cerr << "norvo record: --seconds wants a whole number above 0\n";
+        return std::nullopt;
+      }
+      options.run.duration = std::chrono::seconds(*seconds);
+    } else if (argument == "--seed") {
+      const auto seed = parseNumber<std::uint64_t>(arguments[++i]);
+      if (!seed) {
+        std::cerr << "norvo record: --seed wants a whole number of at least 0\n";
+        return std::nullopt;
+      }
+      options.run.seed = *seed;
+    } else if (argument == "--speed") {
+      const auto speed = parseSpeedFactor(arguments[++i]);
+      if (!speed) {
+        std::cerr << "norvo record: --speed wants a number above 0\n";
+        return std::nullopt;
+      }
+      options.run.speed = *speed;
+    } else if (argument.size() > 1 && argument.front() == '-') {
+      std::cerr << "norvo record: unknown option " << argument << '\n';
+      return std::nullopt;
+    } else if (haveOut) {
+      std::cerr << "norvo record: one metric log at a time, not also " << argument << '\n';
+      return std::nullopt;
+    } else {
+      options.outPath = std::string(argument);
+      haveOut = true;
+    }
+  }
+  if (!haveOut) {
+    std::cerr << "norvo record: which file should the metric log go to?\n";
+    return std::nullopt;
+  }
+  return options;
+}
+
+}  // namespace
+
+void MetricRecorder::metricsDidUpdate(const platform::Dictionary& metric) {
+  const auto sinceStart = std::chrono::duration_cast<std::chrono::milliseconds>(
+      std::chrono::steady_clock::now() - began_);
+  writer_.write(metric, sinceStart.count());
+  if (next_ != nullptr) next_->metricsDidUpdate(metric);
+}
+
+bool runSimulatorSession(const SimulatorRun& run, const std::string& configurationPath,
+                         std::shared_ptr<TarnWrapperDelegate> receiver) {
+  auto service = std::make_shared<tarn::service::Core>(
+      std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed));
+  tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(std::move(service)));
+  bool subscribed = false;
+  {
+    TarnWrapper session;
+    session.setDelegate(receiver);
+    subscribed = session.addVelaConfigForAppId("vexmora", configurationPath);
+    if (subscribed) {
+      session.listen();
+      session.querySpecificMetric("vexmora", kSimQueryTriggerRef, 0, kSimQueryTriggerID, 0, 0);
+
+      boost::asio::steady_timer timer(platform::mainQueue());
+      if (run.duration) {
+        timer.expires_after(*run.duration);
+        timer.async_wait([](const boost::system::error_code& error) {
+          if (!error) platform::stopMainQueue();
+        });
+      }
+      boost::asio::signal_set signals(platform::mainQueue(), SIGINT, SIGTERM);
+      signals.async_wait([](const boost::system::error_code& error, int) {
+        if (!error) platform::stopMainQueue();
+      });
+      platform::runMainQueue();
+    }
+  }
+  // The session is closed; a service without source stops the simulator.
+  tarn::client::useTransport(
+      std::make_shared<tarn::transport::InProcess>(std::make_shared<tarn::service::Core>()));
+  return subscribed;
+}
+
+int runRecordCommand(std::span<const std::string_view> arguments) {
+  for (const std::string_view argument : arguments) {
+    if (argument == "--help" || argument == "-h") {
+      std::cout << kUsage;
+      return 0;
+    }
+  }
+  const std::optional<Options> options = parseOptions(arguments);
+  if (!options) {
+    std::cerr << kUsage;
+    return 2;
+  }
+  const auto configuration =
+      ui::Bundle::mainBundle().pathForResource("fen_test_lte", "deviceconfig");
+  if (!configuration) {
+    std::cerr << "norvo record: cannot find the metric configuration among the resources\n";
+    return 1;
+  }
+  std::ofstream out(options->outPath, std::ios::binary | std::ios::trunc);
+  if (!out) {
+    std::cerr << "norvo record: cannot write " << options->outPath << '\n';
+    return 1;
+  }
+  if (!runSimulatorSession(options->run, *configuration, std::make_shared<MetricRecorder>(out))) {
+    std::cerr << "norvo record: the service refused the metric configuration\n";
+    return 1;
+  }
+  out.close();
+  if (out.fail()) {
+    std::cerr << "norvo record: cannot write " << options->outPath << '\n';
+    return 1;
+  }
+  return 0;
+}
+
+}  // namespace app

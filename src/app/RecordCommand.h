@@ -1,0 +1,51 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <ostream>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "client/TarnWrapperDelegate.h"
+#include "tarn/log/MetricLog.h"
+
+namespace app {
+
+// `norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X]`: records what the simulated phone
+// delivers to the app into a metric log. Answers the exit status.
+int runRecordCommand(std::span<const std::string_view> arguments);
+
+// Writes each metric it receives to a metric log, with "t_ms" counted from its construction, and
+// hands it on to `next`, if any.
+class MetricRecorder final : public TarnWrapperDelegate {
+ public:
+  explicit MetricRecorder(std::ostream& log, TarnWrapperDelegate* next = nullptr)
+      : writer_(log), next_(next) {}
+
+  void metricsDidUpdate(const platform::Dictionary& metric) override;
+  void eventsDidUpdate(const platform::Dictionary&) override {}
+
+ private:
+  const std::chrono::steady_clock::time_point began_ = std::chrono::steady_clock::now();
+  tarn::log::MetricLogWriter writer_;
+  TarnWrapperDelegate* next_;
+};
+
+struct SimulatorRun {
+  std::uint64_t seed = 1;
+  double speed = 1.0;
+  // Until Ctrl-C when empty.
+  std::optional<std::chrono::milliseconds> duration;
+};
+
+// Runs the baseband service in this process with the simulator, opens a session that subscribes
+// with the configuration at `configurationPath` and asks for the SIM files as the app does, and
+// hands every delivered metric to `receiver` on the main queue until the run is over or SIGINT or
+// SIGTERM arrives. False when the service refused the configuration.
+bool runSimulatorSession(const SimulatorRun& run, const std::string& configurationPath,
+                         std::shared_ptr<TarnWrapperDelegate> receiver);
+
+}  // namespace app

@@ -1,0 +1,198 @@
+#include "tarn/replay/ReplaySource.h"
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <filesystem>
+#include <fstream>
+#include <mutex>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <vector>
+
+using namespace std::chrono_literals;
+using tarn::replay::ReplayOptions;
+using tarn::replay::ReplaySource;
+using tarn::service::Metric;
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+// "AQI=" is the payload {1, 2}.
+std::string line(std::uint32_t metricId, std::int64_t deliveryMs) {
+  return "{\"kKeyMetricID\":" + std::to_string(metricId) +
+         ",\"kKeyPayload\":\"AQI=\",\"t_ms\":" + std::to_string(deliveryMs) + "}\n";
+}
+
+class ReplaySourceTest : public ::testing::Test {
+ protected:
+  ReplaySourceTest()
+      : directory_(std::filesystem::temp_directory_path() /
+                   ("norvo-replay-" + std::to_string(::getpid()))) {
+    std::filesystem::create_directories(directory_);
+  }
+  ~ReplaySourceTest() override { std::filesystem::remove_all(directory_); }
+
+  std::string writeLog(const std::string& contents) {
+    const std::string path = (directory_ / "metrics.jsonl").string();
+    std::ofstream(path, std::ios::binary | std::ios::trunc) << contents;
+    return path;
+  }
+
+  // The metric IDs delivered, with when each came after start().
+  struct Delivered {
+    std::uint32_t metricId;
+    Clock::duration after;
+  };
+
+  void startRecording(ReplaySource& source) {
+    const Clock::time_point began = Clock::now();
+    source.start([this, began](Metric metric) {
+      std::lock_guard lock(mutex_);
+      delivered_.push_back({metric.metricId, Clock::now() - began});
+    });
+  }
+
+  std::vector<Delivered> waitFor(std::size_t count, std::chrono::milliseconds timeout = 5s) {
+    const Clock::time_point until = Clock::now() + timeout;
+    while (Clock::now() < until) {
+      {
+        std::lock_guard lock(mutex_);
+        if (delivered_.size() >= count) return delivered_;
+      }
+      std::this_thread::sleep_for(1ms);
+    }
+    std::lock_guard lock(mutex_);
+    return delivered_;
+  }
+
+  std::vector<std::uint32_t> ids(const std::vector<Delivered>& delivered) {
+    std::vector<std::uint32_t> result;
+    for (const Delivered& one : delivered)
+      result.push_back(one.metricId);
+    return result;
+  }
+
+  std::filesystem::path directory_;
+  std::mutex mutex_;
+  std::vector<Delivered> delivered_;
+};
+
+TEST_F(ReplaySourceTest, DeliversTheLogInOrderAtItsTimesScaledBySpeed) {
+  // 2000 ms of log at speed 20: 100 ms of wall clock.
+  const std::string path = writeLog(line(1, 0) + line(2, 1000) + line(3, 2000));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = 20.0, .loop = false}, errors);
+  startRecording(source);
+  const std::vector<Delivered> delivered = waitFor(3);
+  ASSERT_EQ(ids(delivered), (std::vector<std::uint32_t>{1, 2, 3}));
+  EXPECT_LT(delivered[0].after, 40ms);
+  EXPECT_GE(delivered[1].after, 50ms);
+  EXPECT_GE(delivered[2].after, 100ms);
+  EXPECT_LT(delivered[2].after, 1000ms);
+  EXPECT_TRUE(errors.str().empty());
+}
+
+TEST_F(ReplaySourceTest, WithoutSpeedDeliversEverythingAtOnceIgnoringTheGaps) {
+  const std::string path = writeLog(line(1, 0) + line(2, 3'600'000) + line(3, 7'200'000));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors);
+  startRecording(source);
+  const std::vector<Delivered> delivered = waitFor(3, 1s);
+  EXPECT_EQ(ids(delivered), (std::vector<std::uint32_t>{1, 2, 3}));
+}
+
+TEST_F(ReplaySourceTest, LoopingStartsOverAfterTheLastMetricAndStopsOnlyWhenAsked) {
+  const std::string path = writeLog(line(1, 0) + line(2, 10));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = 10.0, .loop = true}, errors);
+  startRecording(source);
+  const std::vector<Delivered> delivered = waitFor(5);
+  source.stop();
+  ASSERT_GE(delivered.size(), 5u);
+  EXPECT_EQ(ids(delivered).at(2), 1u);
+  EXPECT_EQ(ids(delivered).at(3), 2u);
+  EXPECT_EQ(ids(delivered).at(4), 1u);
+
+  const std::size_t afterStop = waitFor(0).size();
+  std::this_thread::sleep_for(20ms);
+  EXPECT_EQ(waitFor(0).size(), afterStop);
+}
+
+TEST_F(ReplaySourceTest, WithoutLoopingDeliversTheLogOnce) {
+  const std::string path = writeLog(line(1, 0) + line(2, 1));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors);
+  startRecording(source);
+  waitFor(2);
+  std::this_thread::sleep_for(20ms);
+  EXPECT_EQ(waitFor(0).size(), 2u);
+}
+
+TEST_F(ReplaySourceTest, ReportsBrokenLinesWithTheirNumbersAndReplaysTheRest) {
+  const std::string path = writeLog(line(1, 0) + "{\"kKeyMetricID\": 7,\n" +  // 2: cut short
+                                    "\n" +                                    // 3: blank
+                                    R"({"kKeyPayload":"AQI="})"
+                                    "\n" +  // 4: no metric ID
+                                    R"({"kKeyMetricID":-1,"kKeyPayload":"AQI="})"
+                                    "\n" +  // 5
+                                    R"({"kKeyMetricID":7})"
+                                    "\n" +  // 6: no payload
+                                    R"({"kKeyMetricID":7,"kKeyPayload":"AQI=","t_ms":-3})"
+                                    "\n" +
+                                    line(2, 5));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors);
+  const std::string report = errors.str();
+  for (const char* at : {":2: ", ":4: ", ":5: ", ":6: ", ":7: "})
+    EXPECT_NE(report.find(path + at), std::string::npos) << at << " in\n" << report;
+  EXPECT_EQ(report.find(path + ":1: "), std::string::npos);
+  EXPECT_EQ(report.find(path + ":3: "), std::string::npos);
+  EXPECT_EQ(report.find(path + ":8: "), std::string::npos);
+
+  startRecording(source);
+  EXPECT_EQ(ids(waitFor(2)), (std::vector<std::uint32_t>{1, 2}));
+}
+
+TEST_F(ReplaySourceTest, StopReturnsPromptlyInTheMiddleOfALongGap) {
+  const std::string path = writeLog(line(1, 0) + line(2, 3'600'000));
+  std::ostringstream errors;
+  ReplaySource source(path, {.speed = 1.0, .loop = false}, errors);
+  startRecording(source);
+  waitFor(1);
+  const Clock::time_point stopping = Clock::now();
+  source.stop();
+  EXPECT_LT(Clock::now() - stopping, 500ms);
+  EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
+}
+
+TEST_F(ReplaySourceTest, AnswersTheSimFileQueryWithTheLastSimFilesOfTheLog) {
+  constexpr std::uint32_t kSimFiles = 0x3C0013;
+  const std::string path = writeLog(line(kSimFiles, 0) +
+                                    R"({"kKeyMetricID":3932179,"kKeyPayload":"Aw=="})"
+                                    "\n" +
+                                    line(1, 5));
+  std::ostringstream errors;
+  ReplaySource source(path, {}, errors);
+  const std::optional<Metric> simFiles = source.query(kSimFiles);
+  ASSERT_TRUE(simFiles);
+  EXPECT_EQ(simFiles->payload, (platform::Bytes{3}));
+  EXPECT_FALSE(source.query(1));
+
+  ReplaySource withoutSimFiles(writeLog(line(1, 0)), {}, errors);
+  EXPECT_FALSE(withoutSimFiles.query(kSimFiles));
+}
+
+TEST_F(ReplaySourceTest, RefusesAMissingFileAndASpeedThatIsNotAboveZero) {
+  std::ostringstream errors;
+  EXPECT_THROW(ReplaySource((directory_ / "missing.jsonl").string(), {}, errors),
+               std::runtime_error);
+  const std::string path = writeLog(line(1, 0));
+  EXPECT_THROW(ReplaySource(path, {.speed = 0.0, .loop = false}, errors), std::invalid_argument);
+}
+
+}  // namespace

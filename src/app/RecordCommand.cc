@@ -7,6 +7,7 @@
 #include <fstream>
 #include <iostream>
 
+#include "app/RootNavigationController.h"
 #include "app/SpeedOption.h"
 #include "client/TarnWrapper.h"
 #include "platform/MainQueue.h"
@@ -27,10 +28,6 @@ constexpr std::string_view kUsage =
     "metric delivered to OUT.jsonl as a metric log, with \"t_ms\" counted from the start, until N\n"
     "seconds have passed or Ctrl-C. --seed chooses the drive (default 1, the viewer's), --speed\n"
     "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n";
-
-// As the app asks for the SIM files at start.
-constexpr std::int32_t kSimQueryTriggerRef = 9999;
-constexpr std::int32_t kSimQueryTriggerID = 0x7F0013;
 
 struct Options {
   std::string outPath;
@@ -117,7 +114,8 @@ bool runSimulatorSession(const SimulatorRun& run, const std::string& configurati
     subscribed = session.addVelaConfigForAppId("vexmora", configurationPath);
     if (subscribed) {
       session.listen();
-      session.querySpecificMetric("vexmora", kSimQueryTriggerRef, 0, kSimQueryTriggerID, 0, 0);
+      session.querySpecificMetric("vexmora", RootNavigationController::kSimQueryTriggerRef, 0,
+                                  RootNavigationController::kSimQueryTriggerID, 0, 0);
 
       boost::asio::steady_timer timer(platform::mainQueue());
       if (run.duration) {

@@ -2,14 +2,6 @@
 
 #include "platform/Log.h"
 
-namespace {
-
-// The SIM file query asked once at start.
-constexpr std::int32_t kSimQueryTriggerRef = 9999;
-constexpr std::int32_t kSimQueryTriggerID = 0x7F0013;
-
-}  // namespace
-
 RootNavigationController::RootNavigationController(std::unique_ptr<ui::ViewController> root)
     : RootNavigationController(std::move(root), &TarnWrapper::sharedInstance(),
                                store::MetricValidator::sharedInstance(), ui::Bundle::mainBundle()) {

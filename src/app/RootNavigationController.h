@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -13,6 +14,10 @@
 // manager, listens, and asks once for the SIM files.
 class RootNavigationController : public ui::NavigationController {
  public:
+  // The SIM file query asked once at start; a recording session asks it too.
+  static constexpr std::int32_t kSimQueryTriggerRef = 9999;
+  static constexpr std::int32_t kSimQueryTriggerID = 0x7F0013;
+
   // With the shared session and intake, and the program's resources.
   explicit RootNavigationController(std::unique_ptr<ui::ViewController> root);
   // `tarnWrapper` may be null: then no command is sent.

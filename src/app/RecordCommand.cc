@@ -11,10 +11,7 @@
 #include "app/SpeedOption.h"
 #include "client/TarnWrapper.h"
 #include "platform/MainQueue.h"
-#include "tarn/client/Transport.h"
-#include "tarn/service/Core.h"
 #include "tarn/sim/SimulatorSource.h"
-#include "tarn/transport/InProcess.h"
 #include "ui/Bundle.h"
 
 namespace app {
@@ -22,16 +19,17 @@ namespace app {
 namespace {
 
 constexpr std::string_view kUsage =
-    "usage: norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"
+    "usage: norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X] [--service WHERE]\n"
     "\n"
     "Runs the simulated phone, subscribes to its metrics as the viewer does and writes every\n"
     "metric delivered to OUT.jsonl as a metric log, with \"t_ms\" counted from the start, until N\n"
     "seconds have passed or Ctrl-C. --seed chooses the drive (default 1, the viewer's), --speed\n"
-    "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n";
+    "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n"
+    "--service dbus (or dbus:system, dbus:ADDRESS) records what tarnd delivers instead.\n";
 
 struct Options {
   std::string outPath;
-  SimulatorRun run;
+  RecordingRun run;
 };
 
 template <class Number>
@@ -46,10 +44,11 @@ std::optional<Number> parseNumber(std::string_view text) {
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
   Options options;
   bool haveOut = false;
+  bool simulatorTuned = false;  // --seed or --speed given
   for (std::size_t i = 0; i < arguments.size(); ++i) {
     const std::string_view argument = arguments[i];
-    const bool takesValue =
-        argument == "--seconds" || argument == "--seed" || argument == "--speed";
+    const bool takesValue = argument == "--seconds" || argument == "--seed" ||
+                            argument == "--speed" || argument == "--service";
     if (takesValue && i + 1 == arguments.size()) {
       std::cerr << "norvo record: " << argument << " needs a value\n";
       return std::nullopt;
@@ -68,6 +67,7 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
         return std::nullopt;
       }
       options.run.seed = *seed;
+      simulatorTuned = true;
     } else if (argument == "--speed") {
       const auto speed = parseSpeedFactor(arguments[++i]);
       if (!speed) {
@@ -75,6 +75,14 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
         return std::nullopt;
       }
       options.run.speed = *speed;
+      simulatorTuned = true;
+    } else if (argument == "--service") {
+      const auto service = parseServiceChoice(arguments[++i]);
+      if (!service) {
+        std::cerr << "norvo record: --service wants builtin, dbus, dbus:system or dbus:ADDRESS\n";
+        return std::nullopt;
+      }
+      options.run.service = *service;
     } else if (argument.size() > 1 && argument.front() == '-') {
       std::cerr << "norvo record: unknown option " << argument << '\n';
       return std::nullopt;
@@ -90,6 +98,11 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
     std::cerr << "norvo record: which file should the metric log go to?\n";
     return std::nullopt;
   }
+  if (simulatorTuned && options.run.service.bus) {
+    std::cerr << "norvo record: --seed and --speed tune the simulator inside Norvo; tarnd takes "
+                 "its own\n";
+    return std::nullopt;
+  }
   return options;
 }
 
@@ -102,11 +115,11 @@ void MetricRecorder::metricsDidUpdate(const platform::Dictionary& metric) {
   if (next_ != nullptr) next_->metricsDidUpdate(metric);
 }
 
-bool runSimulatorSession(const SimulatorRun& run, const std::string& configurationPath,
+bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
                          std::shared_ptr<TarnWrapperDelegate> receiver) {
-  auto service = std::make_shared<tarn::service::Core>(
-      std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed));
-  tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(std::move(service)));
+  useService(run.service, run.service.bus
+                              ? nullptr
+                              : std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed));
   bool subscribed = false;
   {
     TarnWrapper session;
@@ -132,8 +145,7 @@ bool runSimulatorSession(const SimulatorRun& run, const std::string& configurati
     }
   }
   // The session is closed; a service without source stops the simulator.
-  tarn::client::useTransport(
-      std::make_shared<tarn::transport::InProcess>(std::make_shared<tarn::service::Core>()));
+  useService(ServiceChoice{}, nullptr);
   return subscribed;
 }
 
@@ -160,7 +172,7 @@ int runRecordCommand(std::span<const std::string_view> arguments) {
     std::cerr << "norvo record: cannot write " << options->outPath << '\n';
     return 1;
   }
-  if (!runSimulatorSession(options->run, *configuration, std::make_shared<MetricRecorder>(out))) {
+  if (!runRecordingSession(options->run, *configuration, std::make_shared<MetricRecorder>(out))) {
     std::cerr << "norvo record: the service refused the metric configuration\n";
     return 1;
   }

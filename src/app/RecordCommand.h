@@ -9,13 +9,14 @@
 #include <string>
 #include <string_view>
 
+#include "app/ServiceOption.h"
 #include "client/TarnWrapperDelegate.h"
 #include "tarn/log/MetricLog.h"
 
 namespace app {
 
-// `norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X]`: records what the simulated phone
-// delivers to the app into a metric log. Answers the exit status.
+// `norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X] [--service WHERE]`: records what
+// the baseband service delivers to the app into a metric log. Answers the exit status.
 int runRecordCommand(std::span<const std::string_view> arguments);
 
 // Writes each metric it receives to a metric log, with "t_ms" counted from its construction, and
@@ -34,18 +35,20 @@ class MetricRecorder final : public TarnWrapperDelegate {
   TarnWrapperDelegate* next_;
 };
 
-struct SimulatorRun {
+struct RecordingRun {
+  // With the service inside Norvo, the simulated phone runs the drive `seed` at `speed`.
+  ServiceChoice service;
   std::uint64_t seed = 1;
   double speed = 1.0;
   // Until Ctrl-C when empty.
   std::optional<std::chrono::milliseconds> duration;
 };
 
-// Runs the baseband service in this process with the simulator, opens a session that subscribes
-// with the configuration at `configurationPath` and asks for the SIM files as the app does, and
-// hands every delivered metric to `receiver` on the main queue until the run is over or SIGINT or
+// Opens a session with the chosen service (inside Norvo, with the simulator) that subscribes with
+// the configuration at `configurationPath` and asks for the SIM files as the app does, and hands
+// every delivered metric to `receiver` on the main queue until the run is over or SIGINT or
 // SIGTERM arrives. False when the service refused the configuration.
-bool runSimulatorSession(const SimulatorRun& run, const std::string& configurationPath,
+bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
                          std::shared_ptr<TarnWrapperDelegate> receiver);
 
 }  // namespace app

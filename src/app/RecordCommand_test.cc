@@ -24,8 +24,8 @@ TEST(RecordCommand, ARecordingFedToTheIntakeFillsTheStoreAsTheLiveMetricsDid) {
   platform::log::Capture log;
   MetricValidator live(nullptr);
   std::stringstream recording;
-  const SimulatorRun run{.seed = 7, .speed = 30.0, .duration = 1500ms};
-  ASSERT_TRUE(runSimulatorSession(run, kShippedConfiguration,
+  const RecordingRun run{.service = {}, .seed = 7, .speed = 30.0, .duration = 1500ms};
+  ASSERT_TRUE(runRecordingSession(run, kShippedConfiguration,
                                   std::make_shared<MetricRecorder>(recording, &live)));
 
   const std::string text = recording.str();

@@ -8,31 +8,34 @@
 
 #include "app/AppDelegate.h"
 #include "app/MainInterface.h"
+#include "app/ServiceOption.h"
 #include "app/SpeedOption.h"
 #include "platform/Json.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
-#include "tarn/client/Transport.h"
 #include "tarn/replay/ReplaySource.h"
-#include "tarn/service/Core.h"
 #include "tarn/sim/SimulatorSource.h"
-#include "tarn/transport/InProcess.h"
 #include "ui/Application.h"
 #include "ui/web/ListenAddress.h"
 
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT] [--replay LOG.jsonl [--speed X] [--loop]]\n"
+    "usage: norvo [--listen ADDR:PORT] [--service WHERE]\n"
+    "             [--replay LOG.jsonl [--speed X] [--loop]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
     "neighbour cells, carrier aggregation, NAS state, bearers and SIM files. The metrics come\n"
-    "from the simulated phone of the baseband service built into Norvo, or from a metric log.\n"
+    "from the simulated phone of the baseband service built into Norvo, from a metric log, or\n"
+    "from tarnd, the baseband service on D-Bus.\n"
     "\n"
     "options:\n"
     "  --listen ADDR:PORT  where to serve the pages (default 127.0.0.1:8080). Only loopback\n"
     "                      addresses are private; 0.0.0.0:8080 shows the pages to the whole\n"
     "                      network. Port 0 takes any free port.\n"
+    "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
+    "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
+    "                      or \"dbus:ADDRESS\" on another bus\n"
     "  --replay LOG.jsonl  replay a metric log (see norvo record) instead of simulating; lines\n"
     "                      that do not parse are reported and skipped\n"
     "  --speed X           replay X times as fast as recorded (default 1), or \"max\" for\n"
@@ -48,6 +51,7 @@ namespace {
 
 struct ViewerOptions {
   ui::DisplayOptions display;
+  ServiceChoice service;
   std::optional<std::string> replayPath;
   tarn::replay::ReplayOptions replay;
   bool replayTuned = false;  // --speed or --loop given
@@ -67,6 +71,14 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
         return std::nullopt;
       }
       options.display.listen = *endpoint;
+      ++i;
+    } else if (argument == "--service") {
+      const auto service = value ? parseServiceChoice(*value) : std::nullopt;
+      if (!service) {
+        std::cerr << "norvo: --service wants builtin, dbus, dbus:system or dbus:ADDRESS\n";
+        return std::nullopt;
+      }
+      options.service = *service;
       ++i;
     } else if (argument == "--replay") {
       if (!value) {
@@ -93,11 +105,27 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       return std::nullopt;
     }
   }
+  if (options.replayPath && options.service.bus) {
+    std::cerr << "norvo: --replay goes with the built-in service; on D-Bus, run\n"
+                 "       tarnd --source replay:LOG.jsonl\n";
+    return std::nullopt;
+  }
   if (options.replayTuned && !options.replayPath) {
     std::cerr << "norvo: --speed and --loop go with --replay\n";
     return std::nullopt;
   }
   return options;
+}
+
+// The metrics of the service inside Norvo: a replayed log, or the simulated phone.
+std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& options) {
+  if (options.replayPath) {
+    return std::make_shared<tarn::replay::ReplaySource>(*options.replayPath, options.replay,
+                                                        std::cerr);
+  }
+  // The same drive every run, so that what one user sees another can reproduce.
+  constexpr std::uint64_t kDriveSeed = 1;
+  return std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed);
 }
 
 }  // namespace
@@ -107,21 +135,15 @@ int runViewer(std::span<const std::string_view> arguments) {
   if (!options) return 2;
 
   std::shared_ptr<tarn::service::MetricSource> source;
-  if (options->replayPath) {
+  if (!options->service.bus) {  // on a bus, tarnd brings its own
     try {
-      source = std::make_shared<tarn::replay::ReplaySource>(*options->replayPath, options->replay,
-                                                            std::cerr);
+      source = builtInSource(*options);
     } catch (const std::runtime_error& error) {
       std::cerr << "norvo: " << error.what() << '\n';
       return 1;
     }
-  } else {
-    // The same drive every run, so that what one user sees another can reproduce.
-    constexpr std::uint64_t kDriveSeed = 1;
-    source = std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed);
   }
-  auto service = std::make_shared<tarn::service::Core>(std::move(source));
-  tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(service));
+  useService(options->service, std::move(source));
 
   ui::DisplayOptions display = std::move(options->display);
   display.readings.emplace("store", [] {

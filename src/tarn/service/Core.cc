@@ -56,11 +56,12 @@ Core::~Core() {
   if (source_) source_->stop();
 }
 
-Core::SessionId Core::openSession(const std::string& clientName, EventSink sink) {
+Core::SessionId Core::openSession(const std::string& clientName, EventSink sink, std::string peer) {
   const auto app = std::find_if(apps_.begin(), apps_.end(), [&clientName](const App& candidate) {
     return candidate.clientName == clientName;
   });
-  Session session{.appId = app != apps_.end() ? std::optional(app->id) : std::nullopt,
+  Session session{.peer = std::move(peer),
+                  .appId = app != apps_.end() ? std::optional(app->id) : std::nullopt,
                   .sink = std::move(sink)};
   const std::lock_guard lock(mutex_);
   const SessionId id = ++lastSession_;
@@ -75,7 +76,15 @@ void Core::closeSession(SessionId session) {
     const auto found = sessions_.find(session);
     if (found == sessions_.end()) return;
     closing = std::move(found->second.sink);
+    const std::string peer = std::move(found->second.peer);
     sessions_.erase(found);
+    const bool peerRemains =
+        std::any_of(sessions_.begin(), sessions_.end(),
+                    [&peer](const auto& open) { return open.second.peer == peer; });
+    if (!peerRemains) {
+      std::erase_if(configurations_,
+                    [&peer](const auto& entry) { return entry.first.first == peer; });
+    }
   }
   // The sink is released outside the lock: what it holds may be the last reference to a client.
 }
@@ -95,13 +104,20 @@ const std::unordered_map<std::string_view, Core::Command>& Core::commands() {
   return table;
 }
 
-CommandResult Core::perform(std::string_view command, const ipc::Object& input) {
+CommandResult Core::perform(SessionId session, std::string_view command, const ipc::Object& input) {
   const auto found = commands().find(command);
   if (found == commands().end()) {
     return {status::kUnknownCommand, platform::format("unknown command '%s'", command)};
   }
+  std::string peer;
+  {
+    const std::lock_guard lock(mutex_);
+    const auto open = sessions_.find(session);
+    if (open == sessions_.end()) return {status::kNoSession, "no session: it has been closed"};
+    peer = open->second.peer;
+  }
   try {
-    (this->*found->second)(Arguments(input));
+    (this->*found->second)(peer, Arguments(input));
     return {};
   } catch (const Refusal& refusal) {
     return {refusal.status, refusal.message};
@@ -116,7 +132,7 @@ std::int64_t Core::knownAppId(const Arguments& arguments) const {
   return appId;
 }
 
-void Core::addConfiguration(const Arguments& arguments) {
+void Core::addConfiguration(const std::string& peer, const Arguments& arguments) {
   const std::int64_t appId = knownAppId(arguments);
   const std::int64_t payloadType = arguments.integer(kKeyPayloadType, kConfigurationText);
   if (payloadType != kConfigurationText) {
@@ -128,20 +144,20 @@ void Core::addConfiguration(const Arguments& arguments) {
     Configuration configuration = Configuration::parse(
         std::string_view(reinterpret_cast<const char*>(payload.data()), payload.size()));
     const std::lock_guard lock(mutex_);
-    configurations_.insert_or_assign(appId, std::move(configuration));
+    configurations_.insert_or_assign({peer, appId}, std::move(configuration));
   } catch (const ConfigurationError& error) {
     throw Refusal{status::kMalformedConfiguration,
                   platform::format("malformed configuration: %s", error.what())};
   }
 }
 
-void Core::clearConfiguration(const Arguments& arguments) {
+void Core::clearConfiguration(const std::string& peer, const Arguments& arguments) {
   const std::int64_t appId = knownAppId(arguments);
   const std::lock_guard lock(mutex_);
-  configurations_.erase(appId);
+  configurations_.erase({peer, appId});
 }
 
-void Core::queryMetric(const Arguments& arguments) {
+void Core::queryMetric(const std::string& peer, const Arguments& arguments) {
   const std::int64_t appId = knownAppId(arguments);
   const std::int64_t triggerId = arguments.integer(kKeyTriggerID);
   const std::int64_t metricArgument = arguments.integer(kKeyMetricID, 0);
@@ -162,25 +178,26 @@ void Core::queryMetric(const Arguments& arguments) {
       {std::string(kKeyTriggerID), ipc::Object::integer(triggerId)},
       {std::string(kKeyProfileID), ipc::Object::integer(profileId)},
   });
+  const ConfigurationKey app{peer, appId};
   const std::lock_guard lock(mutex_);
-  sendToApp(appId, kEventTrigger, std::move(trigger));
-  sendToApp(appId, kEventMetric, metricRecord(*answer, profileId, appId));
+  sendToApp(app, kEventTrigger, std::move(trigger));
+  sendToApp(app, kEventMetric, metricRecord(*answer, profileId, appId));
 }
 
 void Core::deliver(const Metric& metric) {
   const std::lock_guard lock(mutex_);
-  for (const auto& [appId, configuration] : configurations_) {
+  for (const auto& [app, configuration] : configurations_) {
     if (const std::optional<std::int64_t> profileId = configuration.profileOf(metric.metricId)) {
-      sendToApp(appId, kEventMetric, metricRecord(metric, *profileId, appId));
+      sendToApp(app, kEventMetric, metricRecord(metric, *profileId, app.second));
     }
   }
 }
 
-void Core::sendToApp(std::int64_t appId, std::string_view event, ipc::Object record) {
+void Core::sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record) {
   // Each receiver but the last gets a copy.
   const EventSink* previous = nullptr;
   for (const auto& [id, session] : sessions_) {
-    if (!session.eventsOn || session.appId != appId) continue;
+    if (!session.eventsOn || session.peer != app.first || session.appId != app.second) continue;
     if (previous != nullptr) (*previous)(event, record);
     previous = &session.sink;
   }

@@ -24,6 +24,10 @@ class Arguments;
 // The baseband manager service without its transport: client sessions, the metric configuration
 // of each app, the commands, and the fan-out of metrics and trigger events to the sessions.
 //
+// Sessions belong to a peer: the process at the other end of a transport. Each peer configures
+// its apps for itself, so two clients of one app may ask for different metrics; a peer's
+// configurations go with its last session.
+//
 // Every member may be called from any thread.
 class Core {
  public:
@@ -38,33 +42,38 @@ class Core {
   Core(const Core&) = delete;
   Core& operator=(const Core&) = delete;
 
-  // A session receives the events of the app registered under its client name, once its events
-  // are on. Sinks run while the service holds its lock, so they must not call back into it.
-  SessionId openSession(const std::string& clientName, EventSink sink);
+  // A session receives the events of the app registered under its client name, as its peer has
+  // configured them, once its events are on. Sinks run while the service holds its lock, so they
+  // must not call back into it.
+  SessionId openSession(const std::string& clientName, EventSink sink, std::string peer = {});
   // No sink call for the session runs after this returns.
   void closeSession(SessionId session);
   void setEventsOn(SessionId session, bool on);
 
-  CommandResult perform(std::string_view command, const ipc::Object& input);
+  // Performs a command for the session's peer.
+  CommandResult perform(SessionId session, std::string_view command, const ipc::Object& input);
 
  private:
   struct Session {
+    std::string peer;
     std::optional<std::int64_t> appId;
     EventSink sink;
     bool eventsOn = false;
   };
-  using Command = void (Core::*)(const Arguments&);
+  // The configuration of one app by one peer.
+  using ConfigurationKey = std::pair<std::string, std::int64_t>;
+  using Command = void (Core::*)(const std::string& peer, const Arguments&);
 
   static const std::unordered_map<std::string_view, Command>& commands();
 
-  void addConfiguration(const Arguments& arguments);
-  void clearConfiguration(const Arguments& arguments);
-  void queryMetric(const Arguments& arguments);
+  void addConfiguration(const std::string& peer, const Arguments& arguments);
+  void clearConfiguration(const std::string& peer, const Arguments& arguments);
+  void queryMetric(const std::string& peer, const Arguments& arguments);
 
   std::int64_t knownAppId(const Arguments& arguments) const;
   void deliver(const Metric& metric);
   // Needs mutex_ held.
-  void sendToApp(std::int64_t appId, std::string_view event, ipc::Object record);
+  void sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record);
 
   const std::vector<App> apps_;
   const std::shared_ptr<MetricSource> source_;
@@ -72,7 +81,7 @@ class Core {
   std::mutex mutex_;
   std::map<SessionId, Session> sessions_;
   SessionId lastSession_ = 0;
-  std::unordered_map<std::int64_t, Configuration> configurations_;
+  std::map<ConfigurationKey, Configuration> configurations_;
 };
 
 }  // namespace tarn::service

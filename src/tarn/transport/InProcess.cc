@@ -21,7 +21,7 @@ class InProcessConnection final : public client::Connection {
                         ipc::Object& /*output*/) override {
     const auto core = core_.lock();
     if (!core) return {status::kServiceUnavailable, "the baseband manager service has gone away"};
-    return core->perform(command, input);
+    return core->perform(session_, command, input);
   }
 
   void setEventsOn(bool on) override {

@@ -1,0 +1,252 @@
+#include "tarn/dbus/BusTransport.h"
+
+#include <sdbus-c++/Error.h>
+#include <sdbus-c++/IProxy.h>
+#include <sdbus-c++/Types.h>
+
+#include <map>
+
+#include "platform/Format.h"
+#include "platform/Log.h"
+#include "tarn/Names.h"
+#include "tarn/dbus/Bus.h"
+#include "tarn/dbus/Interface.h"
+#include "tarn/dbus/Loop.h"
+#include "tarn/dbus/Marshal.h"
+
+namespace tarn::dbus {
+
+namespace {
+
+constexpr std::uint64_t kCallTimeoutMicroseconds = 5'000'000;
+
+const std::string kService(kBusName);
+const std::string kManager(kManagerInterface);
+const std::string kSession(kSessionInterface);
+
+CommandResult serviceGone(const std::string& reason) {
+  return {status::kServiceUnavailable, "the baseband manager service has gone away: " + reason};
+}
+
+class BusConnection final : public client::Connection {
+ public:
+  BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::string clientName,
+                client::EventSink sink);
+  ~BusConnection() override;
+  BusConnection(const BusConnection&) = delete;
+  BusConnection& operator=(const BusConnection&) = delete;
+
+  CommandResult perform(std::string_view command, const ipc::Object& input,
+                        ipc::Object& output) override;
+  void setEventsOn(bool on) override;
+
+ private:
+  // The members below run on the loop thread.
+  bool openSession();
+  void sessionLost(const std::string& reason);
+  CommandResult performOnLoop(std::string_view command, const ipc::Object& input);
+  CommandResult callPerformCommand(std::string_view command, const ipc::Object& input);
+  void callSetEventsOn();
+  void remember(std::string_view command, const ipc::Object& input, const CommandResult& result);
+  void receiveEvents(sdbus::Message& signal);
+  void serviceOwnerChanged(sdbus::Message& signal);
+
+  const std::string clientName_;
+  const client::EventSink sink_;
+  Loop loop_;
+
+  std::unique_ptr<sdbus::IProxy> manager_;
+  // Empty while there is no session with the service.
+  std::unique_ptr<sdbus::IProxy> session_;
+  // The unique bus name of the service that opened the session.
+  std::string serviceOwner_;
+  std::string whyNoSession_;
+  sdbus::Slot ownerChanges_;
+  sdbus::Slot events_;
+  // What the session is to be like: the configuration last pushed for each app ID, and whether
+  // its events are on. A session opened again is made like this.
+  std::map<std::int64_t, ipc::Object> configurations_;
+  bool eventsOn_ = false;
+};
+
+BusConnection::BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::string clientName,
+                             client::EventSink sink)
+    : clientName_(std::move(clientName)),
+      sink_(std::move(sink)),
+      loop_(std::move(bus), [this](const std::string& reason) {
+        sessionLost("the bus connection broke: " + reason);
+      }) {
+  loop_.call([this] {
+    sdbus::IConnection& connection = loop_.connection();
+    manager_ = sdbus::createProxy(connection, kService, std::string(kManagerPath));
+    ownerChanges_ = connection.addMatch(
+        platform::format("type='signal',sender='org.freedesktop.DBus',"
+                         "interface='org.freedesktop.DBus',member='NameOwnerChanged',arg0='%s'",
+                         kBusName),
+        [this](sdbus::Message& signal) { serviceOwnerChanged(signal); });
+    events_ = connection.addMatch(platform::format("type='signal',interface='%s',member='%s'",
+                                                   kSessionInterface, kEventsSignal),
+                                  [this](sdbus::Message& signal) { receiveEvents(signal); });
+    if (!openSession()) {
+      platform::log::systemf(
+          "tarn::client: the baseband manager service %s is not on the bus (%s); the session "
+          "opens when it comes",
+          kBusName, whyNoSession_);
+    }
+  });
+}
+
+BusConnection::~BusConnection() {
+  loop_.call([this] {
+    if (!session_) return;
+    try {
+      sdbus::MethodCall close = session_->createMethodCall(kSession, std::string(kClose));
+      close.dontExpectReply();
+      session_->callMethod(close);
+    } catch (const sdbus::Error&) {
+      // The service has gone, and the session with it.
+    }
+  });
+  loop_.stop();
+  events_.reset();
+  ownerChanges_.reset();
+  session_.reset();
+  manager_.reset();
+}
+
+CommandResult BusConnection::perform(std::string_view command, const ipc::Object& input,
+                                     ipc::Object& /*output*/) {
+  return loop_.call([&] { return performOnLoop(command, input); });
+}
+
+void BusConnection::setEventsOn(bool on) {
+  loop_.call([this, on] {
+    eventsOn_ = on;
+    if (session_) callSetEventsOn();
+  });
+}
+
+bool BusConnection::openSession() {
+  try {
+    sdbus::MethodCall open = manager_->createMethodCall(kManager, std::string(kOpenSession));
+    open << clientName_;
+    sdbus::MethodReply reply = manager_->callMethod(open, kCallTimeoutMicroseconds);
+    sdbus::ObjectPath path;
+    reply >> path;
+    serviceOwner_ = reply.getSender();
+    session_ = sdbus::createProxy(loop_.connection(), kService, path);
+  } catch (const sdbus::Error& error) {
+    whyNoSession_ = error.getMessage();
+    return false;
+  }
+  for (const auto& [appId, input] : configurations_) {
+    const CommandResult result = callPerformCommand(kCommandAddConfiguration, input);
+    if (result.status != status::kSuccess) {
+      platform::log::systemf(
+          "tarn::client: the configuration of app %lld was refused again: error=%d msg=%s", appId,
+          result.status, result.message);
+    }
+  }
+  if (eventsOn_ && session_) callSetEventsOn();
+  return session_ != nullptr;
+}
+
+void BusConnection::sessionLost(const std::string& reason) {
+  if (!session_) return;
+  session_.reset();
+  serviceOwner_.clear();
+  whyNoSession_ = reason;
+  platform::log::systemf("tarn::client: lost the session with the baseband manager service (%s)",
+                         reason);
+}
+
+void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
+  std::string name, oldOwner, newOwner;
+  signal >> name >> oldOwner >> newOwner;
+  if (!oldOwner.empty() && oldOwner == serviceOwner_) sessionLost("it left the bus");
+  if (newOwner.empty() || session_) return;
+  if (openSession()) {
+    platform::log::systemf(
+        "tarn::client: the baseband manager service is back; session opened again with %zu "
+        "configuration(s)",
+        configurations_.size());
+  }
+}
+
+CommandResult BusConnection::performOnLoop(std::string_view command, const ipc::Object& input) {
+  const CommandResult result =
+      session_ || openSession() ? callPerformCommand(command, input) : serviceGone(whyNoSession_);
+  remember(command, input, result);
+  return result;
+}
+
+CommandResult BusConnection::callPerformCommand(std::string_view command,
+                                                const ipc::Object& input) {
+  try {
+    sdbus::MethodCall call = session_->createMethodCall(kSession, std::string(kPerformCommand));
+    call << std::string(command);
+    appendRecord(call, input);
+    sdbus::MethodReply reply = session_->callMethod(call, kCallTimeoutMicroseconds);
+    CommandResult result;
+    reply >> result.status >> result.message;
+    return result;
+  } catch (const MalformedRecord& error) {
+    return {status::kInvalidArgument,
+            platform::format("the arguments cannot travel on D-Bus: %s", error.what())};
+  } catch (const sdbus::Error& error) {
+    sessionLost(error.getMessage());
+    return serviceGone(error.getMessage());
+  }
+}
+
+void BusConnection::callSetEventsOn() {
+  try {
+    sdbus::MethodCall call = session_->createMethodCall(kSession, std::string(kSetEventsOn));
+    call << eventsOn_;
+    session_->callMethod(call, kCallTimeoutMicroseconds);
+  } catch (const sdbus::Error& error) {
+    sessionLost(error.getMessage());
+  }
+}
+
+// A configuration pushed while the service is away is pushed when it comes.
+void BusConnection::remember(std::string_view command, const ipc::Object& input,
+                             const CommandResult& result) {
+  if (result.status != status::kSuccess && result.status != status::kServiceUnavailable) return;
+  const ipc::Object* appId = input.find(kKeyAppID);
+  if (appId == nullptr || appId->asInteger() == nullptr) return;
+  if (command == kCommandAddConfiguration) {
+    configurations_.insert_or_assign(*appId->asInteger(), input);
+  } else if (command == kCommandClearConfiguration) {
+    configurations_.erase(*appId->asInteger());
+  }
+}
+
+void BusConnection::receiveEvents(sdbus::Message& signal) {
+  if (!session_ || signal.getPath() != session_->getObjectPath() ||
+      signal.getSender() != serviceOwner_) {
+    return;
+  }
+  try {
+    for (Event& event : readEvents(signal))
+      sink_(event.name, std::move(event.record));
+  } catch (const MalformedRecord& error) {
+    platform::log::systemf("tarn::client: events that do not read dropped: %s", error.what());
+  }
+}
+
+}  // namespace
+
+BusTransport::BusTransport(std::string bus) : bus_(std::move(bus)) {}
+
+std::unique_ptr<client::Connection> BusTransport::connect(const std::string& clientName,
+                                                          client::EventSink sink) {
+  try {
+    return std::make_unique<BusConnection>(connectToBus(bus_), clientName, std::move(sink));
+  } catch (const sdbus::Error& error) {
+    platform::log::systemf("tarn::client: cannot reach the bus %s: %s", bus_, error.getMessage());
+    return nullptr;
+  }
+}
+
+}  // namespace tarn::dbus

@@ -2,15 +2,14 @@
 
 #include <boost/asio/signal_set.hpp>
 #include <boost/asio/steady_timer.hpp>
-#include <charconv>
 #include <csignal>
 #include <fstream>
 #include <iostream>
 
 #include "app/RootNavigationController.h"
-#include "app/SpeedOption.h"
 #include "client/TarnWrapper.h"
 #include "platform/MainQueue.h"
+#include "platform/ParseNumber.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Bundle.h"
 
@@ -32,14 +31,6 @@ struct Options {
   RecordingRun run;
 };
 
-template <class Number>
-std::optional<Number> parseNumber(std::string_view text) {
-  Number number{};
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-  if (error != std::errc() || end != text.data() + text.size()) return std::nullopt;
-  return number;
-}
-
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
   Options options;
@@ -54,14 +45,14 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
       return std::nullopt;
     }
     if (argument == "--seconds") {
-      const auto seconds = parseNumber<std::uint32_t>(arguments[++i]);
+      const auto seconds = platform::parseNumber<std::uint32_t>(arguments[++i]);
       if (!seconds || *seconds == 0) {
         std::cerr << "norvo record: --seconds wants a whole number above 0\n";
         return std::nullopt;
       }
       options.run.duration = std::chrono::seconds(*seconds);
     } else if (argument == "--seed") {
-      const auto seed = parseNumber<std::uint64_t>(arguments[++i]);
+      const auto seed = platform::parseNumber<std::uint64_t>(arguments[++i]);
       if (!seed) {
         std::cerr << "norvo record: --seed wants a whole number of at least 0\n";
         return std::nullopt;
@@ -69,7 +60,7 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
       options.run.seed = *seed;
       simulatorTuned = true;
     } else if (argument == "--speed") {
-      const auto speed = parseSpeedFactor(arguments[++i]);
+      const auto speed = platform::parseSpeedFactor(arguments[++i]);
       if (!speed) {
         std::cerr << "norvo record: --speed wants a number above 0\n";
         return std::nullopt;

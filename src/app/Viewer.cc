@@ -9,8 +9,8 @@
 #include "app/AppDelegate.h"
 #include "app/MainInterface.h"
 #include "app/ServiceOption.h"
-#include "app/SpeedOption.h"
 #include "platform/Json.h"
+#include "platform/ParseNumber.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
 #include "tarn/replay/ReplaySource.h"
@@ -89,7 +89,8 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       ++i;
     } else if (argument == "--speed") {
       const bool asFastAsPossible = value == "max";
-      const auto speed = value && !asFastAsPossible ? parseSpeedFactor(*value) : std::nullopt;
+      const auto speed =
+          value && !asFastAsPossible ? platform::parseSpeedFactor(*value) : std::nullopt;
       if (!speed && !asFastAsPossible) {
         std::cerr << "norvo: --speed wants a number above 0 or \"max\"\n";
         return std::nullopt;

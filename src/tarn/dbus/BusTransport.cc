@@ -41,7 +41,9 @@ class BusConnection final : public client::Connection {
   void setEventsOn(bool on) override;
 
  private:
+  void release();
   // The members below run on the loop thread.
+  void subscribeAndOpen();
   bool openSession();
   void sessionLost(const std::string& reason);
   CommandResult performOnLoop(std::string_view command, const ipc::Object& input);
@@ -76,24 +78,31 @@ BusConnection::BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::strin
       loop_(std::move(bus), [this](const std::string& reason) {
         sessionLost("the bus connection broke: " + reason);
       }) {
-  loop_.call([this] {
-    sdbus::IConnection& connection = loop_.connection();
-    manager_ = sdbus::createProxy(connection, kService, std::string(kManagerPath));
-    ownerChanges_ = connection.addMatch(
-        platform::format("type='signal',sender='org.freedesktop.DBus',"
-                         "interface='org.freedesktop.DBus',member='NameOwnerChanged',arg0='%s'",
-                         kBusName),
-        [this](sdbus::Message& signal) { serviceOwnerChanged(signal); });
-    events_ = connection.addMatch(platform::format("type='signal',interface='%s',member='%s'",
-                                                   kSessionInterface, kEventsSignal),
-                                  [this](sdbus::Message& signal) { receiveEvents(signal); });
-    if (!openSession()) {
-      platform::log::systemf(
-          "tarn::client: the baseband manager service %s is not on the bus (%s); the session "
-          "opens when it comes",
-          kBusName, whyNoSession_);
-    }
-  });
+  try {
+    loop_.call([this] { subscribeAndOpen(); });
+  } catch (...) {
+    release();
+    throw;
+  }
+}
+
+void BusConnection::subscribeAndOpen() {
+  sdbus::IConnection& connection = loop_.connection();
+  manager_ = sdbus::createProxy(connection, kService, std::string(kManagerPath));
+  ownerChanges_ = connection.addMatch(
+      platform::format("type='signal',sender='org.freedesktop.DBus',"
+                       "interface='org.freedesktop.DBus',member='NameOwnerChanged',arg0='%s'",
+                       kBusName),
+      [this](sdbus::Message& signal) { serviceOwnerChanged(signal); });
+  events_ = connection.addMatch(platform::format("type='signal',interface='%s',member='%s'",
+                                                 kSessionInterface, kEventsSignal),
+                                [this](sdbus::Message& signal) { receiveEvents(signal); });
+  if (!openSession()) {
+    platform::log::systemf(
+        "tarn::client: the baseband manager service %s is not on the bus (%s); the session "
+        "opens when it comes",
+        kBusName, whyNoSession_);
+  }
 }
 
 BusConnection::~BusConnection() {
@@ -107,7 +116,12 @@ BusConnection::~BusConnection() {
       // The service has gone, and the session with it.
     }
   });
+  release();
+}
+
+void BusConnection::release() {
   loop_.stop();
+  // The loop has ended, so what it used may go on this thread, before the connection.
   events_.reset();
   ownerChanges_.reset();
   session_.reset();
@@ -162,7 +176,11 @@ void BusConnection::sessionLost(const std::string& reason) {
 
 void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
   std::string name, oldOwner, newOwner;
-  signal >> name >> oldOwner >> newOwner;
+  try {
+    signal >> name >> oldOwner >> newOwner;
+  } catch (const sdbus::Error&) {
+    return;  // not what the bus sends
+  }
   if (!oldOwner.empty() && oldOwner == serviceOwner_) sessionLost("it left the bus");
   if (newOwner.empty() || session_) return;
   if (openSession()) {

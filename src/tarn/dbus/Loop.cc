@@ -5,6 +5,9 @@
 #include <sys/eventfd.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <system_error>
+
 namespace tarn::dbus {
 
 namespace {
@@ -17,8 +20,10 @@ Loop::Loop(std::unique_ptr<sdbus::IConnection> connection,
            std::function<void(const std::string&)> onBusLost)
     : connection_(std::move(connection)),
       onBusLost_(std::move(onBusLost)),
-      wakeFd_(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)),
-      thread_([this] { run(); }) {}
+      wakeFd_(::eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)) {
+  if (wakeFd_ < 0) throw std::system_error(errno, std::generic_category(), "eventfd");
+  thread_ = std::thread([this] { run(); });
+}
 
 Loop::~Loop() {
   stop();

@@ -39,24 +39,38 @@ Service::Service(std::shared_ptr<service::Core> core,
                  std::unique_ptr<sdbus::IConnection> connection,
                  std::function<void(const std::string&)> onBusLost)
     : core_(std::move(core)), loop_(std::move(connection), std::move(onBusLost)) {
-  loop_.call([this] {
-    sdbus::IConnection& bus = loop_.connection();
-    manager_ = sdbus::createObject(bus, std::string(kManagerPath));
-    manager_->registerMethod(kManager, std::string(kOpenSession), "s", {"client_name"}, "o",
-                             {"session"}, [this](sdbus::MethodCall call) { openSession(call); });
-    manager_->registerProperty(kManager, std::string(kVersionProperty), "u",
-                               [](sdbus::PropertyGetReply& reply) { reply << kInterfaceVersion; });
-    manager_->finishRegistration();
-    peersLeaving_ = bus.addMatch(
-        "type='signal',sender='org.freedesktop.DBus',interface='org.freedesktop.DBus',"
-        "member='NameOwnerChanged'",
-        [this](sdbus::Message& signal) {
-          std::string name, oldOwner, newOwner;
+  try {
+    loop_.call([this] { publish(); });
+  } catch (...) {
+    release();
+    throw;
+  }
+}
+
+void Service::publish() {
+  sdbus::IConnection& bus = loop_.connection();
+  manager_ = sdbus::createObject(bus, std::string(kManagerPath));
+  manager_->registerMethod(kManager, std::string(kOpenSession), "s", {"client_name"}, "o",
+                           {"session"}, [this](sdbus::MethodCall call) { openSession(call); });
+  sdbus::Flags constant;
+  constant.set(sdbus::Flags::CONST_PROPERTY_VALUE);
+  manager_->registerProperty(
+      kManager, std::string(kVersionProperty), "u",
+      [](sdbus::PropertyGetReply& reply) { reply << kInterfaceVersion; }, constant);
+  manager_->finishRegistration();
+  peersLeaving_ = bus.addMatch(
+      "type='signal',sender='org.freedesktop.DBus',interface='org.freedesktop.DBus',"
+      "member='NameOwnerChanged'",
+      [this](sdbus::Message& signal) {
+        std::string name, oldOwner, newOwner;
+        try {
           signal >> name >> oldOwner >> newOwner;
-          if (newOwner.empty() && name.starts_with(':')) forgetPeer(name);
-        });
-    bus.requestName(std::string(kBusName));
-  });
+        } catch (const sdbus::Error&) {
+          return;  // not what the bus sends
+        }
+        if (newOwner.empty() && name.starts_with(':')) forgetPeer(name);
+      });
+  bus.requestName(std::string(kBusName));
 }
 
 Service::~Service() {
@@ -64,8 +78,12 @@ Service::~Service() {
     for (const auto& [id, session] : sessions_)
       core_->closeSession(id);
   });
+  release();
+}
+
+void Service::release() {
   loop_.stop();
-  // The loop has ended, so the objects may go on this thread.
+  // The loop has ended, so the objects may go on this thread, before the connection.
   sessions_.clear();
   peersLeaving_.reset();
   manager_.reset();

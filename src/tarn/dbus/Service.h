@@ -35,6 +35,8 @@ class Service {
     Event event;
   };
 
+  void publish();
+  void release();
   void openSession(sdbus::MethodCall& call);
   void performCommand(service::Core::SessionId id, sdbus::MethodCall& call);
   void setEventsOn(service::Core::SessionId id, sdbus::MethodCall& call);

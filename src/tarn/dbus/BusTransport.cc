@@ -5,6 +5,7 @@
 #include <sdbus-c++/Types.h>
 
 #include <map>
+#include <set>
 
 #include "platform/Format.h"
 #include "platform/Log.h"
@@ -48,6 +49,7 @@ class BusConnection final : public client::Connection {
   void sessionLost(const std::string& reason);
   CommandResult performOnLoop(std::string_view command, const ipc::Object& input);
   CommandResult callPerformCommand(std::string_view command, const ipc::Object& input);
+  void noteFailedCall(const sdbus::Error& error);
   void callSetEventsOn();
   void remember(std::string_view command, const ipc::Object& input, const CommandResult& result);
   void receiveEvents(sdbus::Message& signal);
@@ -200,6 +202,10 @@ CommandResult BusConnection::performOnLoop(std::string_view command, const ipc::
 
 CommandResult BusConnection::callPerformCommand(std::string_view command,
                                                 const ipc::Object& input) {
+  // a{sv} cannot say that the arguments were no dictionary at all.
+  if (!input.isDictionary()) {
+    return {status::kInvalidArgument, "the command's arguments are not a dictionary"};
+  }
   try {
     sdbus::MethodCall call = session_->createMethodCall(kSession, std::string(kPerformCommand));
     call << std::string(command);
@@ -212,9 +218,18 @@ CommandResult BusConnection::callPerformCommand(std::string_view command,
     return {status::kInvalidArgument,
             platform::format("the arguments cannot travel on D-Bus: %s", error.what())};
   } catch (const sdbus::Error& error) {
-    sessionLost(error.getMessage());
+    noteFailedCall(error);
     return serviceGone(error.getMessage());
   }
+}
+
+void BusConnection::noteFailedCall(const sdbus::Error& error) {
+  // A service that is slow to answer keeps the session; one that has left or forgotten it does
+  // not.
+  static const std::set<std::string, std::less<>> kSessionGone = {
+      "org.freedesktop.DBus.Error.ServiceUnknown", "org.freedesktop.DBus.Error.NameHasNoOwner",
+      "org.freedesktop.DBus.Error.UnknownObject", "org.freedesktop.DBus.Error.Disconnected"};
+  if (kSessionGone.contains(error.getName())) sessionLost(error.getMessage());
 }
 
 void BusConnection::callSetEventsOn() {
@@ -223,7 +238,7 @@ void BusConnection::callSetEventsOn() {
     call << eventsOn_;
     session_->callMethod(call, kCallTimeoutMicroseconds);
   } catch (const sdbus::Error& error) {
-    sessionLost(error.getMessage());
+    noteFailedCall(error);
   }
 }
 

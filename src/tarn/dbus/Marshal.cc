@@ -88,13 +88,13 @@ void appendValue(sd_bus_message* message, const ipc::Object& value) {
 }
 
 template <class Integer>
-std::int64_t readInteger(sd_bus_message* message, char type) {
+std::int64_t readInteger(sd_bus_message* message, char type, std::string_view key) {
   Integer integer{};
   check(sd_bus_message_read_basic(message, type, &integer), "read integer");
   if constexpr (std::is_same_v<Integer, std::uint64_t>) {
     if (integer > static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max())) {
-      throw MalformedRecord(
-          platform::format("%llu is larger than a 64-bit integer holds", integer));
+      throw MalformedRecord(platform::format(
+          "argument %s is %llu, larger than a 64-bit integer holds", key, integer));
     }
   }
   return static_cast<std::int64_t>(integer);
@@ -108,19 +108,19 @@ ipc::Object readValue(sd_bus_message* message, std::string_view signature, std::
   if (signature.size() == 1) {
     switch (signature[0]) {
       case SD_BUS_TYPE_BYTE:
-        return ipc::Object::integer(readInteger<std::uint8_t>(message, 'y'));
+        return ipc::Object::integer(readInteger<std::uint8_t>(message, 'y', key));
       case SD_BUS_TYPE_INT16:
-        return ipc::Object::integer(readInteger<std::int16_t>(message, 'n'));
+        return ipc::Object::integer(readInteger<std::int16_t>(message, 'n', key));
       case SD_BUS_TYPE_UINT16:
-        return ipc::Object::integer(readInteger<std::uint16_t>(message, 'q'));
+        return ipc::Object::integer(readInteger<std::uint16_t>(message, 'q', key));
       case SD_BUS_TYPE_INT32:
-        return ipc::Object::integer(readInteger<std::int32_t>(message, 'i'));
+        return ipc::Object::integer(readInteger<std::int32_t>(message, 'i', key));
       case SD_BUS_TYPE_UINT32:
-        return ipc::Object::integer(readInteger<std::uint32_t>(message, 'u'));
+        return ipc::Object::integer(readInteger<std::uint32_t>(message, 'u', key));
       case SD_BUS_TYPE_INT64:
-        return ipc::Object::integer(readInteger<std::int64_t>(message, 'x'));
+        return ipc::Object::integer(readInteger<std::int64_t>(message, 'x', key));
       case SD_BUS_TYPE_UINT64:
-        return ipc::Object::integer(readInteger<std::uint64_t>(message, 't'));
+        return ipc::Object::integer(readInteger<std::uint64_t>(message, 't', key));
       case SD_BUS_TYPE_STRING: {
         const char* text = nullptr;
         check(sd_bus_message_read_basic(message, SD_BUS_TYPE_STRING, &text), "read text");

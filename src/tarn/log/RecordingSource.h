@@ -27,6 +27,7 @@ class RecordingSource final : public service::MetricSource {
   void start(std::function<void(service::Metric)> deliver) override;
   void stop() override;
   std::optional<service::Metric> query(std::uint32_t metricId) override;
+  bool startsWithFirstListener() const override { return source_->startsWithFirstListener(); }
 
  private:
   // Called on the wrapped source's delivery thread only.

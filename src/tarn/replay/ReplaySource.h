@@ -41,6 +41,8 @@ class ReplaySource final : public service::MetricSource {
   void stop() override;
   // For the SIM files (0x3C0013), the last such metric in the log, wherever the replay stands.
   std::optional<service::Metric> query(std::uint32_t metricId) override;
+  // A drive plays from its start to its first listener.
+  bool startsWithFirstListener() const override { return true; }
 
  private:
   struct Timed {

@@ -49,11 +49,11 @@ ipc::Object metricRecord(const Metric& metric, std::int64_t profileId, std::int6
 
 Core::Core(std::shared_ptr<MetricSource> source, std::vector<App> apps)
     : apps_(std::move(apps)), source_(std::move(source)) {
-  if (source_) source_->start([this](Metric metric) { deliver(metric); });
+  if (source_ && !source_->startsWithFirstListener()) startSource();
 }
 
 Core::~Core() {
-  if (source_) source_->stop();
+  if (source_) source_->stop();  // harmless when it never started
 }
 
 Core::SessionId Core::openSession(const std::string& clientName, EventSink sink, std::string peer) {
@@ -90,9 +90,20 @@ void Core::closeSession(SessionId session) {
 }
 
 void Core::setEventsOn(SessionId session, bool on) {
-  const std::lock_guard lock(mutex_);
-  const auto found = sessions_.find(session);
-  if (found != sessions_.end()) found->second.eventsOn = on;
+  {
+    const std::lock_guard lock(mutex_);
+    const auto found = sessions_.find(session);
+    if (found == sessions_.end()) return;
+    found->second.eventsOn = on;
+  }
+  if (on) startSource();
+}
+
+// Outside the lock: delivery takes it.
+void Core::startSource() {
+  std::call_once(sourceStarted_, [this] {
+    if (source_) source_->start([this](Metric metric) { deliver(metric); });
+  });
 }
 
 const std::unordered_map<std::string_view, Core::Command>& Core::commands() {

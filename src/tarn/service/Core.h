@@ -35,7 +35,8 @@ class Core {
   // Receives one session's events: the event's name and its record.
   using EventSink = std::function<void(std::string_view event, ipc::Object record)>;
 
-  // Starts `source` (none: a baseband that reports nothing) and stops it again on destruction.
+  // Serves `source` (none: a baseband that reports nothing), starting it at once or, if it asks
+  // to, when the first session switches its events on. Stops it on destruction.
   explicit Core(std::shared_ptr<MetricSource> source = nullptr,
                 std::vector<App> apps = registeredApps());
   ~Core();
@@ -70,6 +71,7 @@ class Core {
   void clearConfiguration(const std::string& peer, const Arguments& arguments);
   void queryMetric(const std::string& peer, const Arguments& arguments);
 
+  void startSource();
   std::int64_t knownAppId(const Arguments& arguments) const;
   void deliver(const Metric& metric);
   // Needs mutex_ held.
@@ -77,6 +79,7 @@ class Core {
 
   const std::vector<App> apps_;
   const std::shared_ptr<MetricSource> source_;
+  std::once_flag sourceStarted_;
 
   std::mutex mutex_;
   std::map<SessionId, Session> sessions_;

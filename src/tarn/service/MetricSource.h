@@ -24,6 +24,9 @@ class MetricSource {
   virtual void stop() = 0;
   // The metric that answers a query, if the source has one (the SIM files for 0x3C0013).
   virtual std::optional<Metric> query(std::uint32_t metricId) = 0;
+  // Whether the service should start the source only once a session listens: a recorded drive
+  // plays from its first metric to its first listener, while a live baseband runs regardless.
+  virtual bool startsWithFirstListener() const { return false; }
 };
 
 }  // namespace tarn::service

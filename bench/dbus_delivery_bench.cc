@@ -1,0 +1,110 @@
+// Delivery of metrics over D-Bus: the service on one bus connection, the app's session on another,
+// a dbus-daemon of the benchmark's own between them. And the viewer as the user runs it: norvo
+// with tarnd and its simulated phone, each a process of its own, measured from outside.
+#include <signal.h>
+
+#include <fstream>
+#include <sstream>
+#include <string>
+
+#include "ChildProcess.h"
+#include "DeliveryPipeline.h"
+#include "PrivateBus.h"
+#include "tarn/dbus/Bus.h"
+#include "tarn/dbus/BusTransport.h"
+#include "tarn/dbus/Service.h"
+
+namespace {
+
+using delivery::BM_DeliveryLatencyAt1000PerSecond;
+using delivery::BM_DeliveryThroughput;
+
+struct BusPath {
+  bustest::PrivateBus bus;
+  std::unique_ptr<tarn::dbus::Service> service;
+  delivery::Pipeline pipeline{[this](std::shared_ptr<tarn::service::Core> core) {
+    service = std::make_unique<tarn::dbus::Service>(std::move(core),
+                                                    tarn::dbus::connectToBus(bus.address()));
+    return std::make_shared<tarn::dbus::BusTransport>(bus.address());
+  }};
+};
+
+// User and system CPU time of a process, in seconds.
+double cpuSecondsOf(pid_t pid) {
+  std::ifstream stat("/proc/" + std::to_string(pid) + "/stat");
+  std::string line;
+  std::getline(stat, line);
+  // The fields after the command's name, which is in parentheses and may hold spaces.
+  std::istringstream fields(line.substr(line.rfind(')') + 2));
+  std::string field;
+  unsigned long long user = 0, system = 0;
+  for (int index = 3; fields >> field; ++index) {
+    if (index == 14) user = std::stoull(field);
+    if (index == 15) {
+      system = std::stoull(field);
+      break;
+    }
+  }
+  return static_cast<double>(user + system) / static_cast<double>(sysconf(_SC_CLK_TCK));
+}
+
+// A line of /proc/PID/status, such as VmRSS, in MiB.
+double statusMebibytes(pid_t pid, std::string_view key) {
+  std::ifstream status("/proc/" + std::to_string(pid) + "/status");
+  for (std::string line; std::getline(status, line);) {
+    if (line.starts_with(key) && line.size() > key.size() && line[key.size()] == ':') {
+      return std::stod(line.substr(key.size() + 1)) / 1024.0;  // given in kB
+    }
+  }
+  return 0.0;
+}
+
+// norvo --service dbus:ADDRESS beside tarnd --source sim at the simulator's own pace, for
+// `state.range(0)` seconds after a few to settle. Norvo's share of one core and its memory.
+void BM_ViewerWithTarnd(benchmark::State& state) {
+  const auto seconds = std::chrono::seconds(state.range(0));
+  for (auto _ : state) {
+    bustest::PrivateBus bus;
+    const auto folder = bus.folder();
+    bustest::ChildProcess tarnd({.arguments = {NORVO_TARND, "--bus", bus.address()},
+                                 .standardOutput = folder / "tarnd.out",
+                                 .standardError = folder / "tarnd.err",
+                                 .descriptor3 = {}});
+    if (!bus.waitForName("org.norvo.Tarn1", true)) {
+      state.SkipWithError("tarnd did not come on the bus");
+      return;
+    }
+    bustest::ChildProcess norvo({.arguments = {NORVO_VIEWER, "--service", "dbus:" + bus.address(),
+                                               "--listen", "127.0.0.1:0"},
+                                 .standardOutput = "/dev/null",
+                                 .standardError = folder / "norvo.err",
+                                 .descriptor3 = {}});
+    std::this_thread::sleep_for(std::chrono::seconds(3));
+    const double cpuBefore = cpuSecondsOf(norvo.pid());
+    std::this_thread::sleep_for(seconds);
+    const double cpuSeconds = cpuSecondsOf(norvo.pid()) - cpuBefore;
+    state.counters["norvo_cpu_percent_of_core"] =
+        100.0 * cpuSeconds / static_cast<double>(seconds.count());
+    state.counters["norvo_rss_mib"] = statusMebibytes(norvo.pid(), "VmRSS");
+    state.counters["norvo_peak_rss_mib"] = statusMebibytes(norvo.pid(), "VmHWM");
+    state.counters["tarnd_cpu_percent_of_core"] =
+        100.0 * cpuSecondsOf(tarnd.pid()) / static_cast<double>(seconds.count() + 3);
+    norvo.stop(SIGTERM, std::chrono::seconds(5));
+    tarnd.stop(SIGTERM, std::chrono::seconds(5));
+  }
+}
+
+}  // namespace
+
+BENCHMARK_TEMPLATE(BM_DeliveryThroughput, BusPath)
+    ->Arg(20000)
+    ->UseRealTime()
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_TEMPLATE(BM_DeliveryLatencyAt1000PerSecond, BusPath)
+    ->Arg(5000)
+    ->Iterations(1)
+    ->UseRealTime()
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_ViewerWithTarnd)->Arg(20)->Iterations(1)->UseRealTime()->Unit(benchmark::kSecond);
+
+BENCHMARK_MAIN();

@@ -1,0 +1,350 @@
+#include "tarn/dbus/Service.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sdbus-c++/sdbus-c++.h>
+
+#include <functional>
+#include <map>
+
+#include "Eventually.h"
+#include "Printing.h"
+#include "PrivateBus.h"
+#include "RecordingSession.h"
+#include "Records.h"
+#include "platform/Log.h"
+#include "tarn/Names.h"
+#include "tarn/dbus/Bus.h"
+#include "tarn/dbus/BusTransport.h"
+#include "tarn/dbus/Interface.h"
+#include "tarn/dbus/Marshal.h"
+#include "tarn/testing/ScriptedMetricSource.h"
+
+namespace {
+
+using bustest::bytesOf;
+using bustest::entry;
+using bustest::eventually;
+using bustest::metricIdsOf;
+using bustest::ReceivedEvent;
+using bustest::RecordingSession;
+using bustest::withAppId;
+using tarn::CommandResult;
+using tarn::ipc::Object;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+namespace status = tarn::status;
+
+constexpr std::uint32_t kRrcState = 0x3C4E04;
+constexpr std::uint32_t kCaStatus = 0x3CD313;
+constexpr std::uint32_t kNeighbours = 0x3CD30F;
+constexpr std::uint32_t kSimFiles = 0x3C0013;
+
+Object metricRecord(std::uint32_t metricId, platform::Bytes payload, std::int64_t profileId) {
+  return Object::dictionary({entry(tarn::kKeyMetricID, Object::integer(metricId)),
+                             entry(tarn::kKeyPayload, Object::bytes(std::move(payload))),
+                             entry(tarn::kKeyProfileID, Object::integer(profileId)),
+                             entry(tarn::kKeyAppID, Object::integer(2))});
+}
+
+ReceivedEvent metricEvent(std::uint32_t metricId, platform::Bytes payload, std::int64_t profileId) {
+  return {std::string(tarn::kEventMetric), metricRecord(metricId, std::move(payload), profileId)};
+}
+
+// A client that talks to the service without the client library, to send what that never would.
+class RawClient {
+ public:
+  using Append = std::function<void(sdbus::Message&)>;
+
+  explicit RawClient(const std::string& address)
+      : connection_(sdbus::createSessionBusConnectionWithAddress(address)) {}
+
+  std::string uniqueName() const { return connection_->getUniqueName(); }
+
+  sdbus::MethodReply call(const std::string& path, std::string_view interface,
+                          std::string_view method, const Append& append = {}) {
+    const auto proxy = sdbus::createProxy(*connection_, std::string(tarn::dbus::kBusName), path);
+    sdbus::MethodCall call = proxy->createMethodCall(std::string(interface), std::string(method));
+    if (append) append(call);
+    return proxy->callMethod(call);
+  }
+
+  std::string openSession(const std::string& clientName) {
+    sdbus::MethodReply reply =
+        call(std::string(tarn::dbus::kManagerPath), tarn::dbus::kManagerInterface,
+             tarn::dbus::kOpenSession, [&](sdbus::Message& m) { m << clientName; });
+    sdbus::ObjectPath path;
+    reply >> path;
+    return path;
+  }
+
+  // PerformCommand with `command` and the record that `append` writes.
+  CommandResult perform(const std::string& session, std::string_view command,
+                        const Append& append) {
+    sdbus::MethodReply reply = call(session, tarn::dbus::kSessionInterface,
+                                    tarn::dbus::kPerformCommand, [&](sdbus::Message& m) {
+                                      m << std::string(command);
+                                      append(m);
+                                    });
+    CommandResult result;
+    reply >> result.status >> result.message;
+    return result;
+  }
+
+  CommandResult perform(const std::string& session, std::string_view command, const Object& input) {
+    return perform(session, command,
+                   [&](sdbus::Message& m) { tarn::dbus::appendRecord(m, input); });
+  }
+
+  void setEventsOn(const std::string& session, bool on) {
+    call(session, tarn::dbus::kSessionInterface, tarn::dbus::kSetEventsOn,
+         [on](sdbus::Message& m) { m << on; });
+  }
+
+ private:
+  std::unique_ptr<sdbus::IConnection> connection_;
+};
+
+// The name of the D-Bus error that `call` throws, or "none".
+std::string errorOf(const std::function<void()>& call) {
+  try {
+    call();
+  } catch (const sdbus::Error& error) {
+    return error.getName();
+  }
+  return "none";
+}
+
+class AServiceOnABus : public ::testing::Test {
+ protected:
+  AServiceOnABus() {
+    tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
+  }
+  ~AServiceOnABus() override { tarn::client::useTransport(nullptr); }
+
+  bustest::PrivateBus bus;
+  std::shared_ptr<tarn::testing::ScriptedMetricSource> source =
+      std::make_shared<tarn::testing::ScriptedMetricSource>();
+  std::shared_ptr<tarn::service::Core> core = std::make_shared<tarn::service::Core>(source);
+  tarn::dbus::Service service{core, tarn::dbus::connectToBus(bus.address())};
+};
+
+TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceGave) {
+  RecordingSession session;
+  const struct {
+    std::string_view command;
+    Object input;
+    CommandResult result;
+  } cases[] = {
+      {tarn::kCommandAddConfiguration,
+       withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))}),
+       {}},
+      {tarn::kCommandClearConfiguration, withAppId({}), {}},
+      {"Reboot", withAppId({}), {status::kUnknownCommand, "unknown command 'Reboot'"}},
+      {tarn::kCommandClearConfiguration,
+       Object::integer(2),
+       {status::kInvalidArgument, "the command's arguments are not a dictionary"}},
+      {tarn::kCommandClearConfiguration,
+       Object::dictionary({entry(tarn::kKeyAppID, Object())}),
+       {status::kMissingArgument, "missing argument kKeyAppID"}},
+      {tarn::kCommandClearConfiguration,
+       Object::dictionary({entry(tarn::kKeyAppID, Object::text("2"))}),
+       {status::kInvalidArgument, "argument kKeyAppID is not an integer"}},
+      {tarn::kCommandClearConfiguration,
+       Object::dictionary({entry(tarn::kKeyAppID, Object::integer(7))}),
+       {status::kUnknownAppId, "unknown app ID 7"}},
+      {tarn::kCommandAddConfiguration,
+       withAppId({entry(tarn::kKeyPayload, bytesOf("0x1\n0xZZ\n"))}),
+       {status::kMalformedConfiguration,
+        "malformed configuration: line 2: '0xZZ' is not a metric ID; write metric IDs in hex, "
+        "like 0x3C4E04"}},
+      {tarn::kCommandAddConfiguration,
+       withAppId({entry(tarn::kKeyPayload, bytesOf("0x1")),
+                  entry(tarn::kKeyPayloadType, Object::integer(1))}),
+       {status::kInvalidArgument, "unsupported payload type 1"}},
+      {tarn::kCommandQueryMetric,
+       withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x3C0013))}),
+       {status::kInvalidArgument,
+        "trigger ID 0x3C0013 asks for no metric; on-demand triggers run from 0x7F0000 to "
+        "0x7FFFFF"}},
+      {tarn::kCommandQueryMetric,
+       withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F4E04))}),
+       {status::kNoSuchMetric, "the baseband has no metric 0x3C4E04 to report"}},
+  };
+  for (const auto& command : cases) {
+    EXPECT_EQ(session.perform(command.command, command.input), command.result) << command.command;
+  }
+
+  const CommandResult untravelled = session.perform(
+      tarn::kCommandClearConfiguration,
+      Object::dictionary({entry(tarn::kKeyAppID, Object::text(std::string("2\0", 2)))}));
+  EXPECT_EQ(untravelled.status, status::kInvalidArgument);
+  EXPECT_THAT(untravelled.message, HasSubstr("NUL"));
+}
+
+TEST_F(AServiceOnABus, DeliversTheSubscribedMetricsAndQueryAnswersInTheirOrder) {
+  RecordingSession session;
+  ASSERT_EQ(session.configure("profile 7\n0x3C4E04\n0x3CD313\n"), CommandResult{});
+  source->answerQueriesWith({kSimFiles, {5, 5}});
+
+  std::vector<ReceivedEvent> expected;
+  for (std::uint32_t i = 0; i < 300; ++i) {
+    const std::uint32_t metricId = i % 3 == 0 ? kCaStatus : kRrcState;
+    platform::Bytes payload = {static_cast<std::uint8_t>(i), static_cast<std::uint8_t>(i >> 8)};
+    source->emit({metricId, payload});
+    source->emit({kNeighbours, {1}});
+    expected.push_back(metricEvent(metricId, std::move(payload), 7));
+  }
+  source->flush();
+  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric,
+                            withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
+                                       entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
+            CommandResult{});
+  expected.push_back({std::string(tarn::kEventTrigger),
+                      withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
+                                 entry(tarn::kKeyTriggerType, Object::integer(0)),
+                                 entry(tarn::kKeyTriggerID, Object::integer(0x7F0013)),
+                                 entry(tarn::kKeyProfileID, Object::integer(0))})});
+  expected.push_back(metricEvent(kSimFiles, {5, 5}, 0));
+
+  EXPECT_EQ(session.waitFor(expected.size()), expected);
+}
+
+TEST_F(AServiceOnABus, GivesEachClientOnlyWhatItsOwnConfigurationSubscribes) {
+  RecordingSession rrc;
+  RecordingSession ca;
+  RecordingSession unconfigured;
+  ASSERT_EQ(rrc.configure("0x3C4E04"), CommandResult{});
+  ASSERT_EQ(ca.configure("profile 5\n0x3CD313"), CommandResult{});
+  source->answerQueriesWith({kSimFiles, {1}});
+
+  source->emit({kRrcState, {1}});
+  source->emit({kCaStatus, {2}});
+  source->emit({kRrcState, {3}});
+  source->flush();
+  // Answers come after everything delivered before them, so the unconfigured session's first
+  // events show that no metric reached it.
+  ASSERT_EQ(
+      unconfigured.perform(tarn::kCommandQueryMetric,
+                           withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
+      CommandResult{});
+
+  EXPECT_EQ(rrc.waitFor(2),
+            (std::vector{metricEvent(kRrcState, {1}, 0), metricEvent(kRrcState, {3}, 0)}));
+  EXPECT_EQ(ca.waitFor(1), std::vector{metricEvent(kCaStatus, {2}, 5)});
+  const std::vector<ReceivedEvent> answers = unconfigured.waitFor(2);
+  ASSERT_EQ(answers.size(), 2u);
+  EXPECT_EQ(answers[0].name, tarn::kEventTrigger);
+  EXPECT_EQ(answers[1], metricEvent(kSimFiles, {1}, 0));
+}
+
+TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKeepsServing) {
+  RawClient owner(bus.address());
+  RawClient intruder(bus.address());
+  const std::string session = owner.openSession("vexmora");
+  EXPECT_THAT(session, StartsWith(tarn::dbus::kSessionPathPrefix));
+  const std::string manager(tarn::dbus::kManagerPath);
+  const auto& sessionInterface = tarn::dbus::kSessionInterface;
+
+  EXPECT_EQ(errorOf([&] {
+              owner.call(manager, tarn::dbus::kManagerInterface, tarn::dbus::kOpenSession,
+                         [](sdbus::Message& m) { m << std::int32_t{2}; });
+            }),
+            "org.freedesktop.DBus.Error.InvalidArgs");
+  EXPECT_EQ(errorOf([&] {
+              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
+                         [](sdbus::Message& m) { m << std::string("ClearConfiguration"); });
+            }),
+            "org.freedesktop.DBus.Error.InvalidArgs");
+  EXPECT_EQ(errorOf([&] {
+              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
+                         [](sdbus::Message& m) {
+                           m << std::string("ClearConfiguration")
+                             << std::map<std::string, std::string>{{"kKeyAppID", "2"}};
+                         });
+            }),
+            "org.freedesktop.DBus.Error.InvalidArgs");
+  EXPECT_EQ(errorOf([&] { owner.call(manager, tarn::dbus::kManagerInterface, "Reboot"); }),
+            "org.freedesktop.DBus.Error.UnknownMethod");
+  EXPECT_EQ(errorOf([&] {
+              owner.call(std::string(tarn::dbus::kSessionPathPrefix) + "999999", sessionInterface,
+                         tarn::dbus::kClose);
+            }),
+            "org.freedesktop.DBus.Error.UnknownObject");
+
+  const CommandResult withABoolean =
+      owner.perform(session, tarn::kCommandClearConfiguration, [](sdbus::Message& m) {
+        m << std::map<std::string, sdbus::Variant>{{"kKeyAppID", sdbus::Variant(true)}};
+      });
+  EXPECT_EQ(withABoolean.status, status::kInvalidArgument);
+  EXPECT_THAT(withABoolean.message, HasSubstr("kKeyAppID"));
+  EXPECT_EQ(owner.perform(session, tarn::kCommandClearConfiguration,
+                          [](sdbus::Message& m) {
+                            m << std::map<std::string, sdbus::Variant>{
+                                {"kKeyAppID", sdbus::Variant(std::uint32_t{2})}};
+                          }),
+            CommandResult{});
+
+  EXPECT_EQ(
+      errorOf([&] { intruder.perform(session, tarn::kCommandClearConfiguration, withAppId({})); }),
+      "org.freedesktop.DBus.Error.AccessDenied");
+  EXPECT_EQ(errorOf([&] { intruder.setEventsOn(session, true); }),
+            "org.freedesktop.DBus.Error.AccessDenied");
+  EXPECT_EQ(errorOf([&] { intruder.call(session, sessionInterface, tarn::dbus::kClose); }),
+            "org.freedesktop.DBus.Error.AccessDenied");
+
+  EXPECT_EQ(owner.perform(session, tarn::kCommandAddConfiguration,
+                          withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))})),
+            CommandResult{});
+  RecordingSession bystander;
+  ASSERT_EQ(bystander.configure("0x3C4E04"), CommandResult{});
+  source->emit({kRrcState, {4}});
+  EXPECT_EQ(bystander.waitFor(1), std::vector{metricEvent(kRrcState, {4}, 0)});
+}
+
+TEST_F(AServiceOnABus, EndsASessionThatItsOwnerCloses) {
+  RawClient owner(bus.address());
+  const std::string session = owner.openSession("vexmora");
+  owner.call(session, tarn::dbus::kSessionInterface, tarn::dbus::kClose);
+
+  // Until the object goes, its commands answer that there is no session.
+  EXPECT_TRUE(eventually([&] {
+    return errorOf([&] {
+             const CommandResult result =
+                 owner.perform(session, tarn::kCommandClearConfiguration, withAppId({}));
+             EXPECT_EQ(result.status, status::kNoSession);
+           }) == "org.freedesktop.DBus.Error.UnknownObject";
+  }));
+}
+
+TEST_F(AServiceOnABus, ForgetsAClientThatLeavesTheBusAndKeepsServingTheOthers) {
+  platform::log::Capture log;
+  RecordingSession stays;
+  ASSERT_EQ(stays.configure("0x3C4E04"), CommandResult{});
+  auto leaves = std::make_unique<RawClient>(bus.address());
+  const std::string leaverName = leaves->uniqueName();
+  const std::string session = leaves->openSession("vexmora");
+  ASSERT_EQ(leaves->perform(session, tarn::kCommandAddConfiguration,
+                            withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))})),
+            CommandResult{});
+  leaves->setEventsOn(session, true);
+  source->emit({kRrcState, {1}});
+  ASSERT_EQ(stays.waitFor(1).size(), 1u);
+
+  leaves.reset();
+  RawClient observer(bus.address());
+  // While the session lives, it is another client's; once it is gone, there is no such object.
+  EXPECT_TRUE(eventually([&] {
+    return errorOf([&] {
+             observer.call(session, tarn::dbus::kSessionInterface, tarn::dbus::kClose);
+           }) == "org.freedesktop.DBus.Error.UnknownObject";
+  }));
+  EXPECT_EQ(log.count("tarnd: client " + leaverName + " left the bus; closed its 1 session(s)"),
+            1u);
+
+  source->emit({kRrcState, {2}});
+  EXPECT_THAT(metricIdsOf(stays.waitFor(2)), ElementsAre(kRrcState, kRrcState));
+}
+
+}  // namespace

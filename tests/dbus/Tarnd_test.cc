@@ -1,0 +1,212 @@
+#include "Tarnd.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <csignal>
+#include <fstream>
+#include <set>
+#include <sstream>
+
+#include "Eventually.h"
+#include "Files.h"
+#include "Printing.h"
+#include "PrivateBus.h"
+#include "RecordingSession.h"
+#include "Records.h"
+#include "TemporaryFolder.h"
+#include "tarn/Names.h"
+#include "tarn/dbus/BusTransport.h"
+#include "tarn/dbus/Interface.h"
+#include "tarn/log/MetricLog.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using bustest::entry;
+using bustest::eventually;
+using bustest::integerAt;
+using bustest::lineCount;
+using bustest::PrivateBus;
+using bustest::ReceivedEvent;
+using bustest::RecordingSession;
+using bustest::startTarnd;
+using bustest::TemporaryFolder;
+using bustest::withAppId;
+using tarn::CommandResult;
+using tarn::ipc::Object;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+
+const std::string kBusName(tarn::dbus::kBusName);
+const std::vector<std::string> kSimulator = {"--source", "sim", "--seed", "3", "--speed", "20"};
+
+// Measurements that the simulated phone reports several times a second on each radio.
+constexpr std::string_view kMeasurements = "0x3CD301\n0x3C4F6A\n0x3CD302\n0x3CD102\n0x3CD002\n";
+const std::set<std::int64_t> kMeasurementIds = {0x3CD301, 0x3C4F6A, 0x3CD302, 0x3CD102, 0x3CD002};
+constexpr std::int64_t kSimFiles = 0x3C0013;
+
+Object simFilesQuery(std::int64_t triggerRef) {
+  return withAppId({entry(tarn::kKeyTriggerRef, Object::integer(triggerRef)),
+                    entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))});
+}
+
+std::vector<std::string> linesOf(const std::string& text) {
+  std::vector<std::string> lines;
+  std::istringstream stream(text);
+  for (std::string line; std::getline(stream, line);)
+    lines.push_back(line);
+  return lines;
+}
+
+// Sessions created while this lives reach the service through the bus at `address`.
+class BusTransportInUse {
+ public:
+  explicit BusTransportInUse(const std::string& address) {
+    tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(address));
+  }
+  ~BusTransportInUse() { tarn::client::useTransport(nullptr); }
+  BusTransportInUse(const BusTransportInUse&) = delete;
+  BusTransportInUse& operator=(const BusTransportInUse&) = delete;
+};
+
+TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationWhenItReturns) {
+  TemporaryFolder folder;
+  PrivateBus bus;
+  BusTransportInUse transport(bus.address());
+  auto first = startTarnd(bus.address(), kSimulator, folder / "first");
+  ASSERT_TRUE(bus.waitForName(kBusName, true)) << first->standardError();
+  RecordingSession session;
+  ASSERT_TRUE(session.manager());
+  ASSERT_EQ(session.configure("profile 1\n" + std::string(kMeasurements)), CommandResult{});
+  const std::vector<ReceivedEvent> before = session.waitFor(5);
+  ASSERT_GE(before.size(), 5u);
+
+  EXPECT_EQ(first->stop(SIGTERM, 10s), 0) << first->standardError();
+  ASSERT_TRUE(bus.waitForName(kBusName, false));
+  const CommandResult gone = session.perform(tarn::kCommandQueryMetric, simFilesQuery(1));
+  EXPECT_EQ(gone.status, tarn::status::kServiceUnavailable);
+  EXPECT_THAT(gone.message, StartsWith("the baseband manager service has gone away"));
+  // Pushed while the service is away, so the returning service must receive it from the client.
+  EXPECT_EQ(session.configure("profile 9\n" + std::string(kMeasurements)).status,
+            tarn::status::kServiceUnavailable);
+  const std::vector<ReceivedEvent> kept = session.received();
+  ASSERT_GE(kept.size(), before.size());
+  EXPECT_TRUE(std::equal(before.begin(), before.end(), kept.begin()));
+
+  auto second = startTarnd(bus.address(), kSimulator, folder / "second");
+  ASSERT_TRUE(bus.waitForName(kBusName, true)) << second->standardError();
+  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric, simFilesQuery(4242)), CommandResult{});
+  // The metric events after the query's trigger event, which only the second service sent.
+  const auto metricsSinceTheQuery = [&session] {
+    const std::vector<ReceivedEvent> events = session.received();
+    const auto trigger = std::find_if(events.begin(), events.end(), [](const ReceivedEvent& e) {
+      return e.name == tarn::kEventTrigger && integerAt(e.record, tarn::kKeyTriggerRef) == 4242;
+    });
+    std::vector<Object> metrics;
+    if (trigger == events.end()) return metrics;
+    for (auto event = trigger + 1; event != events.end(); ++event) {
+      if (event->name == tarn::kEventMetric) metrics.push_back(event->record);
+    }
+    return metrics;
+  };
+  ASSERT_TRUE(eventually([&] { return metricsSinceTheQuery().size() >= 4; }));
+
+  for (const Object& metric : metricsSinceTheQuery()) {
+    const std::int64_t metricId = integerAt(metric, tarn::kKeyMetricID);
+    if (metricId == kSimFiles) continue;  // the query's answer
+    EXPECT_TRUE(kMeasurementIds.contains(metricId)) << metricId;
+    EXPECT_EQ(integerAt(metric, tarn::kKeyProfileID), 9);
+  }
+  EXPECT_EQ(second->stop(SIGTERM, 10s), 0) << second->standardError();
+}
+
+TEST(ASessionWithTarnd, OpenedBeforeTheServiceStartsReceivesWhatItAskedForOnceItComes) {
+  TemporaryFolder folder;
+  PrivateBus bus;
+  BusTransportInUse transport(bus.address());
+  RecordingSession session;
+  ASSERT_TRUE(session.manager());
+  EXPECT_EQ(session.configure("profile 4\n" + std::string(kMeasurements)).status,
+            tarn::status::kServiceUnavailable);
+
+  auto tarnd = startTarnd(bus.address(), kSimulator, folder / "tarnd");
+  const std::vector<ReceivedEvent> events = session.waitFor(3);
+  ASSERT_GE(events.size(), 3u) << tarnd->standardError();
+  for (const ReceivedEvent& event : events) {
+    EXPECT_TRUE(kMeasurementIds.contains(integerAt(event.record, tarn::kKeyMetricID)));
+    EXPECT_EQ(integerAt(event.record, tarn::kKeyProfileID), 4);
+  }
+  EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0) << tarnd->standardError();
+}
+
+TEST(ATarnd, ReplaysALogReportingEachBrokenLineWithItsNumber) {
+  TemporaryFolder folder;
+  PrivateBus bus;
+  const std::string rrcState =
+      R"({"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","kKeyProfileID":0,"kKeyAppID":2,"t_ms":0})";
+  const std::string caStatus =
+      R"({"kKeyMetricID":3986195,"kKeyPayload":"CPr79bWAMhITCAAQAhitAjACWJ+kAWCtEnCrZg==","t_ms":250})";
+  const std::string log = (folder / "broken.jsonl").string();
+  std::ofstream(log) << rrcState << "\n"
+                     << "not json\n"
+                     << "\n"
+                     << "[1,2]\n"
+                     << R"({"kKeyMetricID":3952132,"kKeyPayload":"!!!"})"
+                     << "\n"
+                     << R"({"kKeyPayload":"CID69bWAMhAD"})"
+                     << "\n"
+                     << R"({"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","t_ms":-5})"
+                     << "\n"
+                     << caStatus << "\n";
+  const std::filesystem::path recording = folder / "replayed.jsonl";
+
+  auto tarnd = startTarnd(
+      bus.address(),
+      {"--source", "replay:" + log, "--as-fast-as-possible", "--record", recording.string()},
+      folder / "tarnd");
+  ASSERT_TRUE(bus.waitForName(kBusName, true)) << tarnd->standardError();
+  // The replay waits for its first listener.
+  EXPECT_EQ(lineCount(recording), 0u);
+  BusTransportInUse transport(bus.address());
+  RecordingSession listener;
+  ASSERT_TRUE(eventually([&] { return lineCount(recording) == 2; }));
+  EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0);
+
+  std::vector<int> reported;
+  for (const std::string& line : linesOf(tarnd->standardError())) {
+    EXPECT_THAT(line, StartsWith(log + ":"));
+    EXPECT_THAT(line, ::testing::EndsWith("; line skipped"));
+    reported.push_back(std::atoi(line.c_str() + log.size() + 1));
+  }
+  EXPECT_THAT(reported, ElementsAre(2, 4, 5, 6, 7));
+
+  std::ifstream replayed(recording);
+  tarn::log::MetricLogReader reader(replayed);
+  std::vector<std::int64_t> metricIds;
+  while (const auto line = reader.next()) {
+    ASSERT_TRUE(line->parsed.entry) << line->parsed.error;
+    const platform::Value* id = line->parsed.entry->record.find("kKeyMetricID");
+    metricIds.push_back(id != nullptr ? id->asInteger().value_or(-1) : -1);
+  }
+  EXPECT_THAT(metricIds, ElementsAre(3952132, 3986195));
+}
+
+TEST(ATarnd, ExitsWithAMessageWhenItsNameIsTakenAndWhenItsBusGoesAway) {
+  TemporaryFolder folder;
+  auto bus = std::make_unique<PrivateBus>();
+  auto serving = startTarnd(bus->address(), kSimulator, folder / "serving");
+  ASSERT_TRUE(bus->waitForName(kBusName, true)) << serving->standardError();
+
+  auto second = startTarnd(bus->address(), kSimulator, folder / "second");
+  EXPECT_EQ(second->wait(10s), 1);
+  EXPECT_THAT(second->standardError(), HasSubstr("is another tarnd running?"));
+
+  bus.reset();
+  EXPECT_EQ(serving->wait(10s), 1);
+  EXPECT_THAT(serving->standardError(), HasSubstr("tarnd: lost the connection to the bus at"));
+}
+
+}  // namespace

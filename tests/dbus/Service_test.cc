@@ -4,8 +4,12 @@
 #include <gtest/gtest.h>
 #include <sdbus-c++/sdbus-c++.h>
 
+#include <fstream>
 #include <functional>
 #include <map>
+#include <regex>
+#include <set>
+#include <sstream>
 
 #include "Eventually.h"
 #include "Printing.h"
@@ -114,6 +118,40 @@ std::string errorOf(const std::function<void()>& call) {
     return error.getName();
   }
   return "none";
+}
+
+// The members of the service's own interfaces in introspection XML, one line each: interface,
+// kind, name, type or access where given, and the arguments in their order.
+std::set<std::string> membersIn(const std::string& xml) {
+  static const std::regex comment(R"re(<!--[\s\S]*?-->)re");
+  static const std::regex interface(
+      R"re(<interface name="(org\.norvo\.[^"]+)">([\s\S]*?)</interface>)re");
+  static const std::regex member(R"re(<(method|signal|property)\b([^>]*?)(/>|>([\s\S]*?)</\1>))re");
+  static const std::regex arg(R"re(<arg\b([^>]*?)/>)re");
+  static const std::regex attribute(R"re((\w+)="([^"]*)")re");
+  const auto attributes = [](const std::string& text) {
+    std::map<std::string, std::string> found;
+    for (std::sregex_iterator it(text.begin(), text.end(), attribute), end; it != end; ++it)
+      found[(*it)[1]] = (*it)[2];
+    return found;
+  };
+  const std::string plain = std::regex_replace(xml, comment, "");
+  std::set<std::string> members;
+  for (std::sregex_iterator i(plain.begin(), plain.end(), interface), end; i != end; ++i) {
+    const std::string body = (*i)[2];
+    for (std::sregex_iterator m(body.begin(), body.end(), member); m != end; ++m) {
+      auto own = attributes((*m)[2]);
+      std::string line = (*i)[1].str() + " " + (*m)[1].str() + " " + own["name"] + " " +
+                         own["type"] + " " + own["access"];
+      const std::string args = (*m)[4];
+      for (std::sregex_iterator a(args.begin(), args.end(), arg); a != end; ++a) {
+        auto of = attributes((*a)[1]);
+        line += " (" + of["direction"] + " " + of["type"] + " " + of["name"] + ")";
+      }
+      members.insert(line);
+    }
+  }
+  return members;
 }
 
 class AServiceOnABus : public ::testing::Test {
@@ -345,6 +383,25 @@ TEST_F(AServiceOnABus, ForgetsAClientThatLeavesTheBusAndKeepsServingTheOthers) {
 
   source->emit({kRrcState, {2}});
   EXPECT_THAT(metricIdsOf(stays.waitFor(2)), ElementsAre(kRrcState, kRrcState));
+}
+
+TEST_F(AServiceOnABus, ServesTheInterfaceThatItsIntrospectionFileDocuments) {
+  RawClient client(bus.address());
+  const auto introspect = [&client](const std::string& path) {
+    sdbus::MethodReply reply =
+        client.call(path, "org.freedesktop.DBus.Introspectable", "Introspect");
+    std::string xml;
+    reply >> xml;
+    return xml;
+  };
+  std::set<std::string> served = membersIn(introspect(std::string(tarn::dbus::kManagerPath)));
+  served.merge(membersIn(introspect(client.openSession("vexmora"))));
+
+  std::ifstream file(NORVO_INTERFACE_XML);
+  std::stringstream documented;
+  documented << file.rdbuf();
+  EXPECT_EQ(served, membersIn(documented.str()));
+  EXPECT_EQ(served.size(), 6u);
 }
 
 }  // namespace

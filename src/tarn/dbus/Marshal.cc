@@ -100,46 +100,46 @@ std::int64_t readInteger(sd_bus_message* message, char type, std::string_view ke
   return static_cast<std::int64_t>(integer);
 }
 
+struct IntegerType {
+  char type;
+  std::int64_t (*read)(sd_bus_message* message, char type, std::string_view key);
+};
+
+// Every D-Bus integer type reads as a 64-bit integer.
+constexpr IntegerType kIntegerTypes[] = {
+    {SD_BUS_TYPE_BYTE, &readInteger<std::uint8_t>},
+    {SD_BUS_TYPE_INT16, &readInteger<std::int16_t>},
+    {SD_BUS_TYPE_UINT16, &readInteger<std::uint16_t>},
+    {SD_BUS_TYPE_INT32, &readInteger<std::int32_t>},
+    {SD_BUS_TYPE_UINT32, &readInteger<std::uint32_t>},
+    {SD_BUS_TYPE_INT64, &readInteger<std::int64_t>},
+    {SD_BUS_TYPE_UINT64, &readInteger<std::uint64_t>},
+};
+
 ipc::Object readEntries(sd_bus_message* message);
 ipc::Object readArray(sd_bus_message* message);
 
 // Reads the value of type `signature` at the current position.
 ipc::Object readValue(sd_bus_message* message, std::string_view signature, std::string_view key) {
-  if (signature.size() == 1) {
-    switch (signature[0]) {
-      case SD_BUS_TYPE_BYTE:
-        return ipc::Object::integer(readInteger<std::uint8_t>(message, 'y', key));
-      case SD_BUS_TYPE_INT16:
-        return ipc::Object::integer(readInteger<std::int16_t>(message, 'n', key));
-      case SD_BUS_TYPE_UINT16:
-        return ipc::Object::integer(readInteger<std::uint16_t>(message, 'q', key));
-      case SD_BUS_TYPE_INT32:
-        return ipc::Object::integer(readInteger<std::int32_t>(message, 'i', key));
-      case SD_BUS_TYPE_UINT32:
-        return ipc::Object::integer(readInteger<std::uint32_t>(message, 'u', key));
-      case SD_BUS_TYPE_INT64:
-        return ipc::Object::integer(readInteger<std::int64_t>(message, 'x', key));
-      case SD_BUS_TYPE_UINT64:
-        return ipc::Object::integer(readInteger<std::uint64_t>(message, 't', key));
-      case SD_BUS_TYPE_STRING: {
-        const char* text = nullptr;
-        check(sd_bus_message_read_basic(message, SD_BUS_TYPE_STRING, &text), "read text");
-        return ipc::Object::text(text);
-      }
-      default:
-        break;
+  for (const IntegerType& integer : kIntegerTypes) {
+    if (signature.size() == 1 && signature[0] == integer.type) {
+      return ipc::Object::integer(integer.read(message, integer.type, key));
     }
-  } else if (signature == "ay") {
+  }
+  if (signature == "s") {
+    const char* text = nullptr;
+    check(sd_bus_message_read_basic(message, SD_BUS_TYPE_STRING, &text), "read text");
+    return ipc::Object::text(text);
+  }
+  if (signature == "ay") {
     const void* data = nullptr;
     std::size_t size = 0;
     check(sd_bus_message_read_array(message, SD_BUS_TYPE_BYTE, &data, &size), "read bytes");
     const auto* bytes = static_cast<const std::uint8_t*>(data);
     return ipc::Object::bytes(platform::Bytes(bytes, bytes + size));
-  } else if (signature == "av") {
-    return readArray(message);
-  } else if (signature == "a{sv}") {
-    return readEntries(message);
   }
+  if (signature == "av") return readArray(message);
+  if (signature == "a{sv}") return readEntries(message);
   throw MalformedRecord(platform::format(
       "argument %s has the D-Bus type '%s', which records do not carry; use x, ay, s, av or a{sv}",
       key, signature));

@@ -10,6 +10,8 @@
 #include "ChildProcess.h"
 #include "DeliveryPipeline.h"
 #include "PrivateBus.h"
+#include "Tarnd.h"
+#include "TemporaryFolder.h"
 #include "tarn/dbus/Bus.h"
 #include "tarn/dbus/BusTransport.h"
 #include "tarn/dbus/Service.h"
@@ -59,26 +61,34 @@ double statusMebibytes(pid_t pid, std::string_view key) {
   return 0.0;
 }
 
+std::size_t linesSaying(const std::filesystem::path& path, std::string_view text) {
+  std::ifstream file(path);
+  std::size_t count = 0;
+  for (std::string line; std::getline(file, line);) {
+    if (line == text) ++count;
+  }
+  return count;
+}
+
 // norvo --service dbus:ADDRESS beside tarnd --source sim at the simulator's own pace, for
 // `state.range(0)` seconds after a few to settle. Norvo's share of one core and its memory.
 void BM_ViewerWithTarnd(benchmark::State& state) {
   const auto seconds = std::chrono::seconds(state.range(0));
   for (auto _ : state) {
+    bustest::TemporaryFolder folder;
     bustest::PrivateBus bus;
-    const auto folder = bus.folder();
-    bustest::ChildProcess tarnd({.arguments = {NORVO_TARND, "--bus", bus.address()},
-                                 .standardOutput = folder / "tarnd.out",
-                                 .standardError = folder / "tarnd.err",
-                                 .descriptor3 = {}});
+    const auto tarnd = bustest::startTarnd(bus.address(), {"--source", "sim"}, folder / "tarnd");
     if (!bus.waitForName("org.norvo.Tarn1", true)) {
       state.SkipWithError("tarnd did not come on the bus");
       return;
     }
-    bustest::ChildProcess norvo({.arguments = {NORVO_VIEWER, "--service", "dbus:" + bus.address(),
-                                               "--listen", "127.0.0.1:0"},
-                                 .standardOutput = "/dev/null",
-                                 .standardError = folder / "norvo.err",
-                                 .descriptor3 = {}});
+    bustest::ChildProcess norvo(bustest::ChildProcess::Options{
+        .arguments = {NORVO_VIEWER, "--service", "dbus:" + bus.address(), "--listen",
+                      "127.0.0.1:0"},
+        .standardOutput = folder / "norvo.out",
+        .standardError = folder / "norvo.err",
+        .descriptor3 = std::nullopt,
+    });
     std::this_thread::sleep_for(std::chrono::seconds(3));
     const double cpuBefore = cpuSecondsOf(norvo.pid());
     std::this_thread::sleep_for(seconds);
@@ -88,9 +98,12 @@ void BM_ViewerWithTarnd(benchmark::State& state) {
     state.counters["norvo_rss_mib"] = statusMebibytes(norvo.pid(), "VmRSS");
     state.counters["norvo_peak_rss_mib"] = statusMebibytes(norvo.pid(), "VmHWM");
     state.counters["tarnd_cpu_percent_of_core"] =
-        100.0 * cpuSecondsOf(tarnd.pid()) / static_cast<double>(seconds.count() + 3);
+        100.0 * cpuSecondsOf(tarnd->pid()) / static_cast<double>(seconds.count() + 3);
     norvo.stop(SIGTERM, std::chrono::seconds(5));
-    tarnd.stop(SIGTERM, std::chrono::seconds(5));
+    tarnd->stop(SIGTERM, std::chrono::seconds(5));
+    // What the viewer took in, so that the figures are known to be of a working viewer.
+    state.counters["norvo_metrics_taken_in"] =
+        static_cast<double>(linesSaying(folder / "norvo.out", "Received Valid Metric"));
   }
 }
 

@@ -38,30 +38,6 @@ class Codable {
   Codable& operator=(const Codable&) = default;
 };
 
-// Decodes the length-delimited value at the reader's position into `record`.
-template <class Record>
-[[nodiscard]] bool readNested(Reader& reader, Record& record) {
-  RegionMark mark;
-  if (!reader.enterRegion(mark) || !record.readFrom(reader)) return false;
-  reader.leaveRegion(mark);
-  return true;
-}
-
-// Appends a packed run's values, or the single value of an unpacked field.
-template <class Run, class Decode>
-[[nodiscard]] bool readPacked(Reader& reader, std::uint32_t wireType, Run& run, Decode decode) {
-  if (wireType != kWireLengthDelimited) {
-    run.add(decode(reader.readVarint()));
-    return true;
-  }
-  RegionMark mark;
-  if (!reader.enterRegion(mark)) return false;
-  while (reader.position() < reader.length() && !reader.hasError())
-    run.add(decode(reader.readVarint()));
-  reader.leaveRegion(mark);
-  return true;
-}
-
 // Nested records compare by value; both absent counts as equal.
 template <class Record>
 bool sameRecord(const std::shared_ptr<Record>& a, const std::shared_ptr<Record>& b) {

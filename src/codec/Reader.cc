@@ -1,43 +1,60 @@
 #include "codec/Reader.h"
 
+#include <bit>
+#include <cstring>
+
 namespace codec {
 namespace {
+constexpr unsigned kMaxVarintBytes = 10;
 // Groups are a retired encoding that no record uses; nesting is capped so a
 // hostile payload cannot exhaust the stack.
 constexpr unsigned kMaxGroupDepth = 64;
 }  // namespace
 
-std::uint64_t Reader::readVarintChecked() {
+VarintRead readVarintAt(const std::uint8_t* position, const std::uint8_t* end) {
+  if (end - position >= 8) {
+    // The varints of up to eight bytes (every value below 2^56: timestamps, cell identities)
+    // decode from one load: the first clear continuation bit ends the varint, and its 7-bit
+    // groups are packed together in three steps of doubling width.
+    static_assert(std::endian::native == std::endian::little, "the first byte is the lowest");
+    std::uint64_t word;
+    std::memcpy(&word, position, sizeof word);
+    const std::uint64_t stops = ~word & 0x8080808080808080u;
+    if (stops != 0) {
+      word &= (stops ^ (stops - 1)) & 0x7F7F7F7F7F7F7F7Fu;
+      word = (word & 0x007F007F007F007Fu) | (word & 0x7F007F007F007F00u) >> 1;
+      word = (word & 0x00003FFF00003FFFu) | (word & 0x3FFF00003FFF0000u) >> 2;
+      word = (word & 0x000000000FFFFFFFu) | (word & 0x0FFFFFFF00000000u) >> 4;
+      return {word, position + (std::countr_zero(stops) + 1) / 8};
+    }
+  }
   std::uint64_t value = 0;
   for (unsigned shift = 0; shift < 7 * kMaxVarintBytes; shift += 7) {
-    std::uint8_t byte = 0;
-    if (position_ + 1 != 0 && position_ + 1 <= length_) {
-      byte = bytes_[position_++];
-    } else {
-      error_ = true;
-    }
+    if (position == end) return {0, nullptr};
+    const std::uint8_t byte = *position++;
     value |= static_cast<std::uint64_t>(byte & 0x7F) << shift;
-    if ((byte & 0x80) == 0) return error_ ? 0 : value;
+    if ((byte & 0x80) == 0) return {value, position};
   }
-  return 0;
+  return {0, position};
+}
+
+std::uint64_t Reader::readLongVarint() {
+  const VarintRead read = readVarintAt(position_, end_);
+  if (read.next == nullptr) {
+    error_ = true;
+    position_ = end_;
+    return 0;
+  }
+  position_ = read.next;
+  return error_ ? 0 : read.value;
 }
 
 bool Reader::advance(std::uint64_t count) {
-  if (count > length_ || position_ > length_ - count) {
+  if (count > static_cast<std::uint64_t>(end_ - position_)) {
     error_ = true;
     return false;
   }
   position_ += count;
-  return true;
-}
-
-bool Reader::readLength(std::uint64_t& length) {
-  length = readVarint();
-  if (error_) return false;
-  if (position_ > length_ || length > length_ - position_) {
-    error_ = true;
-    return false;
-  }
   return true;
 }
 
@@ -55,10 +72,8 @@ bool Reader::skipValue(std::uint32_t field, std::uint32_t wireType, unsigned dep
     case kWireFixed32:
       return advance(4);
     case kWireLengthDelimited: {
-      std::uint64_t length = 0;
-      if (!readLength(length)) return false;
-      position_ += length;
-      return true;
+      const std::uint64_t length = readVarint();
+      return !error_ && advance(length);
     }
     case kWireStartGroup:
       if (depth >= kMaxGroupDepth) return false;
@@ -73,30 +88,6 @@ bool Reader::skipValue(std::uint32_t field, std::uint32_t wireType, unsigned dep
     default:
       return false;
   }
-}
-
-std::optional<platform::Bytes> Reader::readBytes() {
-  std::uint64_t length = 0;
-  if (!readLength(length)) return std::nullopt;
-  const auto* begin = bytes_ + position_;
-  position_ += length;
-  return platform::Bytes(begin, begin + length);
-}
-
-std::optional<std::string> Reader::readString() {
-  std::uint64_t length = 0;
-  if (!readLength(length)) return std::nullopt;
-  const auto* begin = reinterpret_cast<const char*>(bytes_ + position_);
-  position_ += length;
-  return std::string(begin, static_cast<std::size_t>(length));
-}
-
-bool Reader::enterRegion(RegionMark& mark) {
-  std::uint64_t length = 0;
-  if (!readLength(length)) return false;
-  mark.length = length_;
-  length_ = position_ + length;
-  return true;
 }
 
 }  // namespace codec

@@ -1,8 +1,6 @@
 #pragma once
 
 #include <cstdint>
-#include <optional>
-#include <string>
 
 #include "platform/Value.h"
 
@@ -17,76 +15,54 @@ enum WireType : std::uint32_t {
   kWireFixed32 = 5,
 };
 
-// What enterRegion saves so that leaveRegion can restore the readable length.
-struct RegionMark {
-  std::uint64_t length = 0;
+// A varint read from `position`: its value and the byte after it, or no next byte when the input
+// ends inside the varint. Up to 10 bytes, 7 bits each, least significant group first; a varint
+// whose tenth byte still continues yields 0 after those ten bytes.
+struct VarintRead {
+  std::uint64_t value;
+  const std::uint8_t* next;
 };
+VarintRead readVarintAt(const std::uint8_t* position, const std::uint8_t* end);
 
 // Reads the Protocol Buffers wire format from a borrowed byte buffer.
 //
 // Every byte of the buffer is untrusted. A read never goes past the readable
-// length: a read that would sets the error flag and yields 0 (or nothing), and
-// once the flag is set every later varint read yields 0 too.
+// length: a read that would sets the error flag and yields 0 (a skip, false), and
+// once the flag is set every later varint read yields 0 too. Records decode
+// through a Cursor taken from the reader.
 class Reader {
  public:
-  Reader(const std::uint8_t* bytes, std::uint64_t length) : bytes_(bytes), length_(length) {}
+  Reader(const std::uint8_t* bytes, std::uint64_t length)
+      : begin_(bytes), position_(bytes), end_(bytes + length) {}
   explicit Reader(const platform::Bytes& bytes) : Reader(bytes.data(), bytes.size()) {}
 
-  const std::uint8_t* bytes() const { return bytes_; }
-  std::uint64_t length() const { return length_; }
-  std::uint64_t position() const { return position_; }
+  const std::uint8_t* bytes() const { return begin_; }
+  std::uint64_t length() const { return static_cast<std::uint64_t>(end_ - begin_); }
+  std::uint64_t position() const { return static_cast<std::uint64_t>(position_ - begin_); }
   bool hasError() const { return error_; }
   void setError() { error_ = true; }
 
-  // Up to 10 bytes, 7 bits each, least significant group first. A varint
-  // whose tenth byte still continues yields 0 without an error.
+  // A varint as readVarintAt reads it; 0, with the error flag set, when it is cut short.
   std::uint64_t readVarint() {
-    if (!error_ && position_ < length_) {
-      // Keys and most values fit in one byte; nested records are short, so a varint is often
-      // within ten bytes of its region's end, where the unchecked read would not be allowed.
-      const std::uint8_t first = bytes_[position_];
-      if ((first & 0x80) == 0) {
-        ++position_;
-        return first;
-      }
-      if (length_ - position_ >= kMaxVarintBytes) return readVarintUnchecked();
-    }
-    return readVarintChecked();
+    // Keys and most values fit in one byte.
+    if (!error_ && position_ < end_ && (*position_ & 0x80) == 0) return *position_++;
+    return readLongVarint();
   }
 
   // Skips one value of the given wire type; false when the input is cut short
   // or the wire type is not one a value can have.
   [[nodiscard]] bool skip(std::uint32_t field, std::uint32_t wireType);
 
-  // Length-delimited values; absent when the input is cut short.
-  std::optional<platform::Bytes> readBytes();
-  std::optional<std::string> readString();
-
-  // Narrows the readable length to the length-delimited value that starts at
-  // the position; false when its length runs past the readable length.
-  [[nodiscard]] bool enterRegion(RegionMark& mark);
-  void leaveRegion(const RegionMark& mark) { length_ = mark.length; }
-
  private:
-  static constexpr std::uint64_t kMaxVarintBytes = 10;
+  friend class Cursor;  // takes the position, end and error flag, and gives them back
 
-  std::uint64_t readVarintUnchecked() {
-    std::uint64_t value = 0;
-    for (unsigned shift = 0; shift < 7 * kMaxVarintBytes; shift += 7) {
-      const std::uint8_t byte = bytes_[position_++];
-      value |= static_cast<std::uint64_t>(byte & 0x7F) << shift;
-      if ((byte & 0x80) == 0) return value;
-    }
-    return 0;
-  }
-  std::uint64_t readVarintChecked();
-  [[nodiscard]] bool readLength(std::uint64_t& length);
+  std::uint64_t readLongVarint();
   [[nodiscard]] bool advance(std::uint64_t count);
   [[nodiscard]] bool skipValue(std::uint32_t field, std::uint32_t wireType, unsigned depth);
 
-  const std::uint8_t* bytes_;
-  std::uint64_t length_;
-  std::uint64_t position_ = 0;
+  const std::uint8_t* begin_;
+  const std::uint8_t* position_;
+  const std::uint8_t* end_;
   bool error_ = false;
 };
 

@@ -20,19 +20,19 @@ struct ScalarKind {
 ScalarKind scalarKind(const FieldDescriptor& field) {
   switch (field.type()) {
     case FieldDescriptor::TYPE_UINT64:
-      return {"std::uint64_t", "reader.readVarint()", "writeUint64", "$member$"};
+      return {"std::uint64_t", "cursor.readVarint()", "writeUint64", "$member$"};
     case FieldDescriptor::TYPE_UINT32:
-      return {"std::uint32_t", "static_cast<std::uint32_t>(reader.readVarint())", "writeUint32",
+      return {"std::uint32_t", "static_cast<std::uint32_t>(cursor.readVarint())", "writeUint32",
               "static_cast<std::uint64_t>($member$)"};
     case FieldDescriptor::TYPE_SINT32:
-      return {"std::int32_t", "codec::decodeZigzag32(reader.readVarint())", "writeSint32",
+      return {"std::int32_t", "codec::decodeZigzag32(cursor.readVarint())", "writeSint32",
               "static_cast<std::uint64_t>(static_cast<std::int64_t>($member$))"};
     case FieldDescriptor::TYPE_BOOL:
-      return {"bool", "reader.readVarint() != 0", "writeBool",
+      return {"bool", "cursor.readVarint() != 0", "writeBool",
               "static_cast<std::uint64_t>($member$)"};
     case FieldDescriptor::TYPE_ENUM:
       return {"std::int32_t",
-              "static_cast<std::int32_t>(static_cast<std::uint32_t>(reader.readVarint()))",
+              "static_cast<std::int32_t>(static_cast<std::uint32_t>(cursor.readVarint()))",
               "writeInt32", "static_cast<std::uint64_t>(static_cast<std::int64_t>($member$))"};
     default:
       throw std::runtime_error("field " + field.full_name() +
@@ -88,7 +88,7 @@ class ScalarEmitter : public FieldEmitter {
   }
   void decode(Printer& p) const override {
     p.Print(vars_,
-            "presence_ |= $bit$;\n"
+            "presence.add($bit$);\n"
             "$member$ = $decoded$;\n");
   }
   void encode(Printer& p) const override {
@@ -152,7 +152,11 @@ class TextEmitter : public FieldEmitter {
   void declareMember(Printer& p) const override {
     p.Print(vars_, "std::optional<$ctype$> $member$;\n");
   }
-  void decode(Printer& p) const override { p.Print(vars_, "$member$ = reader.read$kind$();\n"); }
+  void decode(Printer& p) const override {
+    p.Print(vars_,
+            "$member$ = cursor.read$kind$();\n"
+            "if (cursor.hasError()) return cursor.finish(reader);\n");
+  }
   void encode(Printer& p) const override {
     p.Print(vars_, "if ($member$) writer.write$kind$(*$member$, $number$);\n");
   }
@@ -188,7 +192,7 @@ class MessageEmitter : public FieldEmitter {
     // The new record is stored before it is read, so a failed read keeps it.
     p.Print(vars_,
             "$member$ = std::make_shared<$Type$>();\n"
-            "if (!codec::readNested(reader, *$member$)) return false;\n");
+            "if (!cursor.readNested(reader, *$member$)) return false;\n");
   }
   void encode(Printer& p) const override {
     p.Print(vars_, "if ($member$) writer.writeMessage(*$member$, $number$);\n");
@@ -250,8 +254,9 @@ class RepeatedMessageEmitter : public FieldEmitter {
   void decode(Printer& p) const override {
     // The element joins the list before it is read, so a failed read keeps it.
     p.Print(vars_,
+            "if ($member$.empty()) $member$.reserve(cursor.countAdjacent(key));\n"
             "auto& element = $member$.emplace_back(std::make_shared<$Type$>());\n"
-            "if (!codec::readNested(reader, *element)) return false;\n");
+            "if (!cursor.readNested(reader, *element)) return false;\n");
   }
   void encode(Printer& p) const override {
     p.Print(vars_,
@@ -318,7 +323,9 @@ class PackedEmitter : public FieldEmitter {
     p.Print(vars_, "codec::PackedRun<$ctype$> $member$;\n");
   }
   void decode(Printer& p) const override {
-    p.Print(vars_, "if (!codec::readPacked(reader, wireType, $member$, $decode$)) return false;\n");
+    p.Print(
+        vars_,
+        "if (!cursor.readPacked(wireType, $member$, $decode$)) return cursor.finish(reader);\n");
   }
   void encode(Printer& p) const override {
     p.Print(vars_,

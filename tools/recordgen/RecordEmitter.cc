@@ -134,13 +134,18 @@ void RecordEmitter::define(Printer& p) const {
 }
 
 void RecordEmitter::defineReadFrom(Printer& p) const {
+  // The position and the presence bits live in locals while the fields are read (see
+  // codec::Cursor); the reader is brought up to date around anything that reads through it.
   p.Print(vars_,
           "bool $Class$::readFrom(codec::Reader& reader) {\n"
-          "  while (reader.position() < reader.length()) {\n"
-          "    if (reader.hasError()) break;\n"
-          "    const std::uint64_t key = reader.readVarint();\n"
-          "    const auto wireType = static_cast<std::uint32_t>(key & 7);\n"
-          "    if (reader.hasError() || wireType == codec::kWireEndGroup) break;\n");
+          "  if (reader.hasError()) return false;\n"
+          "  codec::Cursor cursor(reader);\n");
+  if (!vars_.at("hasScalars").empty()) p.Print("  codec::PresenceBits presence(presence_);\n");
+  p.Print(
+      "  while (cursor.hasMore()) {\n"
+      "    const std::uint64_t key = cursor.readKey();\n"
+      "    const auto wireType = static_cast<std::uint32_t>(key & 7);\n"
+      "    if (wireType == codec::kWireEndGroup) break;\n");
   if (rawFieldNumbers_) {
     p.Print("    const std::uint32_t field = static_cast<std::uint32_t>(key) >> 3;\n");
   } else {
@@ -149,7 +154,9 @@ void RecordEmitter::defineReadFrom(Printer& p) const {
     p.Print(vars_,
             "    const auto field = static_cast<std::uint16_t>(key >> 3);\n"
             "    if (KBBMetricUtility::isValidMetricIdTag(field, typeid($Class$))) {\n"
+            "      cursor.storeTo(reader);\n"
             "      consumeMetricIdTag(reader, field);\n"
+            "      cursor.loadFrom(reader);\n"
             "      continue;\n"
             "    }\n");
   }
@@ -167,14 +174,16 @@ void RecordEmitter::defineReadFrom(Printer& p) const {
   }
   p.Print(
       "default:\n"
-      "  if (!reader.skip(field, wireType)) return false;\n");
+      "  cursor.storeTo(reader);\n"
+      "  if (!reader.skip(field, wireType)) return false;\n"
+      "  cursor.loadFrom(reader);\n");
   p.Outdent();
   p.Outdent();
   p.Outdent();
   p.Print(
       "    }\n"
       "  }\n"
-      "  return !reader.hasError();\n"
+      "  return cursor.finish(reader);\n"
       "}\n\n");
 }
 

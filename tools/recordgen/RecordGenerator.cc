@@ -92,7 +92,9 @@ void writeSource(const FileDescriptor& file, const std::vector<const Descriptor*
   p.Print(
       "#include \"messages/$stem$.records.h\"\n\n"
       "#include <typeinfo>\n\n"
+      "#include \"codec/Cursor.h\"\n"
       "#include \"codec/Hash.h\"\n"
+      "#include \"codec/PresenceBits.h\"\n"
       "#include \"messages/EnumNames.h\"\n"
       "#include \"messages/KBBMetricUtility.h\"\n"
       "#include \"messages/MetricIdTag.h\"\n\n"

@@ -57,7 +57,6 @@ class BusConnection final : public client::Connection {
 
   const std::string clientName_;
   const client::EventSink sink_;
-  Loop loop_;
 
   std::unique_ptr<sdbus::IProxy> manager_;
   // Empty while there is no session with the service.
@@ -71,6 +70,8 @@ class BusConnection final : public client::Connection {
   // its events are on. A session opened again is made like this.
   std::map<std::int64_t, ipc::Object> configurations_;
   bool eventsOn_ = false;
+  // Last, so that its thread starts once every member it may touch is there.
+  Loop loop_;
 };
 
 BusConnection::BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::string clientName,

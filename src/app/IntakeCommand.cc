@@ -4,18 +4,15 @@
 #include <fstream>
 #include <functional>
 #include <iostream>
-#include <memory>
 #include <optional>
 #include <string>
 
+#include "app/ServiceOption.h"
 #include "platform/Json.h"
 #include "platform/MainQueue.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
-#include "tarn/client/Transport.h"
 #include "tarn/log/MetricLog.h"
-#include "tarn/service/Core.h"
-#include "tarn/transport/InProcess.h"
 
 namespace app {
 
@@ -61,13 +58,6 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
     return std::nullopt;
   }
   return options;
-}
-
-// Only the log's records may reach the store: sessions opened from now on reach a service in
-// this process that has no metric source.
-void useSilentService() {
-  tarn::client::useTransport(
-      std::make_shared<tarn::transport::InProcess>(std::make_shared<tarn::service::Core>()));
 }
 
 bool writeDump(std::ofstream& file, const store::MetricValidator& intake) {
@@ -136,7 +126,8 @@ int runIntakeCommand(std::span<const std::string_view> arguments) {
     }
   }
 
-  useSilentService();
+  // Only the log's records may reach the store: the service in this process has no source.
+  useService(ServiceChoice{}, nullptr);
   store::MetricValidator& intake = store::MetricValidator::sharedInstance();
   const bool read = deliverMetricLog(log, logName, intake, std::cerr);
   std::fflush(stdout);

@@ -8,6 +8,7 @@
 #include <string>
 
 #include "app/ServiceOption.h"
+#include "platform/CommandLine.h"
 #include "platform/Json.h"
 #include "platform/MainQueue.h"
 #include "store/MetricValidator.h"
@@ -32,32 +33,16 @@ struct Options {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
-  Options options;
-  bool haveLog = false;
-  for (std::size_t i = 0; i < arguments.size(); ++i) {
-    const std::string_view argument = arguments[i];
-    if (argument == "--dump-store") {
-      if (i + 1 == arguments.size()) {
-        std::cerr << "norvo intake: --dump-store needs a file name\n";
-        return std::nullopt;
-      }
-      options.dumpPath = std::string(arguments[++i]);
-    } else if (argument.size() > 1 && argument.front() == '-') {
-      std::cerr << "norvo intake: unknown option " << argument << '\n';
-      return std::nullopt;
-    } else if (haveLog) {
-      std::cerr << "norvo intake: one metric log at a time, not also " << argument << '\n';
-      return std::nullopt;
-    } else {
-      options.logPath = std::string(argument);
-      haveLog = true;
-    }
-  }
-  if (!haveLog) {
-    std::cerr << "norvo intake: which metric log? (\"-\" for standard input)\n";
+  std::optional<std::string_view> log, dump;
+  const platform::CommandLineOption table[] = {{"--dump-store", &dump, "a file name"}};
+  const platform::CommandLinePositional logArgument{&log, "metric log",
+                                                    "which metric log? (\"-\" for standard input)"};
+  if (const std::string error = platform::readCommandLine(arguments, table, logArgument);
+      !error.empty()) {
+    std::cerr << "norvo intake: " << error << '\n';
     return std::nullopt;
   }
-  return options;
+  return Options{std::string(*log), dump ? std::optional<std::string>(*dump) : std::nullopt};
 }
 
 bool writeDump(std::ofstream& file, const store::MetricValidator& intake) {
@@ -94,11 +79,9 @@ bool deliverMetricLog(std::istream& log, std::string_view logName, TarnWrapperDe
 }
 
 int runIntakeCommand(std::span<const std::string_view> arguments) {
-  for (const std::string_view argument : arguments) {
-    if (argument == "--help" || argument == "-h") {
-      std::cout << kUsage;
-      return 0;
-    }
+  if (platform::asksForHelp(arguments)) {
+    std::cout << kUsage;
+    return 0;
   }
   const std::optional<Options> options = parseOptions(arguments);
   if (!options) {

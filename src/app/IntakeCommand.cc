@@ -4,18 +4,16 @@
 #include <fstream>
 #include <functional>
 #include <iostream>
-#include <memory>
 #include <optional>
 #include <string>
 
+#include "app/ServiceOption.h"
+#include "platform/CommandLine.h"
 #include "platform/Json.h"
 #include "platform/MainQueue.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
-#include "tarn/client/Transport.h"
 #include "tarn/log/MetricLog.h"
-#include "tarn/service/Core.h"
-#include "tarn/transport/InProcess.h"
 
 namespace app {
 
@@ -35,39 +33,16 @@ struct Options {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
-  Options options;
-  bool haveLog = false;
-  for (std::size_t i = 0; i < arguments.size(); ++i) {
-    const std::string_view argument = arguments[i];
-    if (argument == "--dump-store") {
-      if (i + 1 == arguments.size()) {
-        std::cerr << "norvo intake: --dump-store needs a file name\n";
-        return std::nullopt;
-      }
-      options.dumpPath = std::string(arguments[++i]);
-    } else if (argument.size() > 1 && argument.front() == '-') {
-      std::cerr << "norvo intake: unknown option " << argument << '\n';
-      return std::nullopt;
-    } else if (haveLog) {
-      std::cerr << "norvo intake: one metric log at a time, not also " << argument << '\n';
-      return std::nullopt;
-    } else {
-      options.logPath = std::string(argument);
-      haveLog = true;
-    }
-  }
-  if (!haveLog) {
-    std::cerr << "norvo intake: which metric log? (\"-\" for standard input)\n";
+  std::optional<std::string_view> log, dump;
+  const platform::CommandLineOption table[] = {{"--dump-store", &dump, "a file name"}};
+  const platform::CommandLinePositional logArgument{&log, "metric log",
+                                                    "which metric log? (\"-\" for standard input)"};
+  if (const std::string error = platform::readCommandLine(arguments, table, logArgument);
+      !error.empty()) {
+    std::cerr << "norvo intake: " << error << '\n';
     return std::nullopt;
   }
-  return options;
-}
-
-// Only the log's records may reach the store: sessions opened from now on reach a service in
-// this process that has no metric source.
-void useSilentService() {
-  tarn::client::useTransport(
-      std::make_shared<tarn::transport::InProcess>(std::make_shared<tarn::service::Core>()));
+  return Options{std::string(*log), dump ? std::optional<std::string>(*dump) : std::nullopt};
 }
 
 bool writeDump(std::ofstream& file, const store::MetricValidator& intake) {
@@ -104,11 +79,9 @@ bool deliverMetricLog(std::istream& log, std::string_view logName, TarnWrapperDe
 }
 
 int runIntakeCommand(std::span<const std::string_view> arguments) {
-  for (const std::string_view argument : arguments) {
-    if (argument == "--help" || argument == "-h") {
-      std::cout << kUsage;
-      return 0;
-    }
+  if (platform::asksForHelp(arguments)) {
+    std::cout << kUsage;
+    return 0;
   }
   const std::optional<Options> options = parseOptions(arguments);
   if (!options) {
@@ -136,7 +109,8 @@ int runIntakeCommand(std::span<const std::string_view> arguments) {
     }
   }
 
-  useSilentService();
+  // Only the log's records may reach the store: the service in this process has no source.
+  useService(ServiceChoice{}, nullptr);
   store::MetricValidator& intake = store::MetricValidator::sharedInstance();
   const bool read = deliverMetricLog(log, logName, intake, std::cerr);
   std::fflush(stdout);

@@ -8,6 +8,7 @@
 
 #include "app/RootNavigationController.h"
 #include "client/TarnWrapper.h"
+#include "platform/CommandLine.h"
 #include "platform/MainQueue.h"
 #include "platform/ParseNumber.h"
 #include "tarn/sim/SimulatorSource.h"
@@ -31,69 +32,50 @@ struct Options {
   RecordingRun run;
 };
 
+std::nullopt_t refuse(std::string_view why) {
+  std::cerr << "norvo record: " << why << '\n';
+  return std::nullopt;
+}
+
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
-  Options options;
-  bool haveOut = false;
-  bool simulatorTuned = false;  // --seed or --speed given
-  for (std::size_t i = 0; i < arguments.size(); ++i) {
-    const std::string_view argument = arguments[i];
-    const bool takesValue = argument == "--seconds" || argument == "--seed" ||
-                            argument == "--speed" || argument == "--service";
-    if (takesValue && i + 1 == arguments.size()) {
-      std::cerr << "norvo record: " << argument << " needs a value\n";
-      return std::nullopt;
-    }
-    if (argument == "--seconds") {
-      const auto seconds = platform::parseNumber<std::uint32_t>(arguments[++i]);
-      if (!seconds || *seconds == 0) {
-        std::cerr << "norvo record: --seconds wants a whole number above 0\n";
-        return std::nullopt;
-      }
-      options.run.duration = std::chrono::seconds(*seconds);
-    } else if (argument == "--seed") {
-      const auto seed = platform::parseNumber<std::uint64_t>(arguments[++i]);
-      if (!seed) {
-        std::cerr << "norvo record: --seed wants a whole number of at least 0\n";
-        return std::nullopt;
-      }
-      options.run.seed = *seed;
-      simulatorTuned = true;
-    } else if (argument == "--speed") {
-      const auto speed = platform::parseSpeedFactor(arguments[++i]);
-      if (!speed) {
-        std::cerr << "norvo record: --speed wants a number above 0\n";
-        return std::nullopt;
-      }
-      options.run.speed = *speed;
-      simulatorTuned = true;
-    } else if (argument == "--service") {
-      const auto service = parseServiceChoice(arguments[++i]);
-      if (!service) {
-        std::cerr << "norvo record: --service wants builtin, dbus, dbus:system or dbus:ADDRESS\n";
-        return std::nullopt;
-      }
-      options.run.service = *service;
-    } else if (argument.size() > 1 && argument.front() == '-') {
-      std::cerr << "norvo record: unknown option " << argument << '\n';
-      return std::nullopt;
-    } else if (haveOut) {
-      std::cerr << "norvo record: one metric log at a time, not also " << argument << '\n';
-      return std::nullopt;
-    } else {
-      options.outPath = std::string(argument);
-      haveOut = true;
-    }
+  std::optional<std::string_view> out, seconds, seed, speed, service;
+  const platform::CommandLineOption table[] = {
+      {"--seconds", &seconds},
+      {"--seed", &seed},
+      {"--speed", &speed},
+      {"--service", &service},
+  };
+  const platform::CommandLinePositional outArgument{&out, "metric log",
+                                                    "which file should the metric log go to?"};
+  if (const std::string error = platform::readCommandLine(arguments, table, outArgument);
+      !error.empty()) {
+    return refuse(error);
   }
-  if (!haveOut) {
-    std::cerr << "norvo record: which file should the metric log go to?\n";
-    return std::nullopt;
+
+  Options options{.outPath = std::string(*out), .run = {}};
+  if (seconds) {
+    const auto whole = platform::parseNumber<std::uint32_t>(*seconds);
+    if (!whole || *whole == 0) return refuse("--seconds wants a whole number above 0");
+    options.run.duration = std::chrono::seconds(*whole);
   }
-  if (simulatorTuned && options.run.service.bus) {
-    std::cerr << "norvo record: --seed and --speed tune the simulator inside Norvo; tarnd takes "
-                 "its own\n";
-    return std::nullopt;
+  if (seed) {
+    const auto drive = platform::parseNumber<std::uint64_t>(*seed);
+    if (!drive) return refuse("--seed wants a whole number of at least 0");
+    options.run.seed = *drive;
   }
+  if (speed) {
+    const auto factor = platform::parseSpeedFactor(*speed);
+    if (!factor) return refuse("--speed wants a number above 0");
+    options.run.speed = *factor;
+  }
+  if (service) {
+    const auto choice = parseServiceChoice(*service);
+    if (!choice) return refuse("--service wants builtin, dbus, dbus:system or dbus:ADDRESS");
+    options.run.service = *choice;
+  }
+  if ((seed || speed) && options.run.service.bus)
+    return refuse("--seed and --speed tune the simulator inside Norvo; tarnd takes its own");
   return options;
 }
 
@@ -141,11 +123,9 @@ bool runRecordingSession(const RecordingRun& run, const std::string& configurati
 }
 
 int runRecordCommand(std::span<const std::string_view> arguments) {
-  for (const std::string_view argument : arguments) {
-    if (argument == "--help" || argument == "-h") {
-      std::cout << kUsage;
-      return 0;
-    }
+  if (platform::asksForHelp(arguments)) {
+    std::cout << kUsage;
+    return 0;
   }
   const std::optional<Options> options = parseOptions(arguments);
   if (!options) {

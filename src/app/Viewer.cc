@@ -9,6 +9,7 @@
 #include "app/AppDelegate.h"
 #include "app/MainInterface.h"
 #include "app/ServiceOption.h"
+#include "platform/CommandLine.h"
 #include "platform/Json.h"
 #include "platform/ParseNumber.h"
 #include "store/MetricValidator.h"
@@ -54,67 +55,54 @@ struct ViewerOptions {
   ServiceChoice service;
   std::optional<std::string> replayPath;
   tarn::replay::ReplayOptions replay;
-  bool replayTuned = false;  // --speed or --loop given
 };
+
+std::nullopt_t refuse(std::string_view why) {
+  std::cerr << "norvo: " << why << '\n';
+  return std::nullopt;
+}
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
+  std::optional<std::string_view> listen, service, replay, speed;
+  bool loop = false;
+  const platform::CommandLineOption table[] = {
+      {"--listen", &listen, "an address and a port"},
+      {"--service", &service},
+      {"--replay", &replay, "a metric log"},
+      {"--speed", &speed},
+      {"--loop", &loop},
+  };
+  if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
+    std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
+    return std::nullopt;
+  }
+
   ViewerOptions options;
-  for (std::size_t i = 0; i < arguments.size(); ++i) {
-    const std::string_view argument = arguments[i];
-    const std::optional<std::string_view> value =
-        i + 1 < arguments.size() ? std::optional(arguments[i + 1]) : std::nullopt;
-    if (argument == "--listen") {
-      const auto endpoint = value ? ui::web::parseListenAddress(*value) : std::nullopt;
-      if (!endpoint) {
-        std::cerr << "norvo: --listen wants an address and a port, such as 127.0.0.1:8080\n";
-        return std::nullopt;
-      }
-      options.display.listen = *endpoint;
-      ++i;
-    } else if (argument == "--service") {
-      const auto service = value ? parseServiceChoice(*value) : std::nullopt;
-      if (!service) {
-        std::cerr << "norvo: --service wants builtin, dbus, dbus:system or dbus:ADDRESS\n";
-        return std::nullopt;
-      }
-      options.service = *service;
-      ++i;
-    } else if (argument == "--replay") {
-      if (!value) {
-        std::cerr << "norvo: --replay needs a metric log\n";
-        return std::nullopt;
-      }
-      options.replayPath = std::string(*value);
-      ++i;
-    } else if (argument == "--speed") {
-      const bool asFastAsPossible = value == "max";
-      const auto speed =
-          value && !asFastAsPossible ? platform::parseSpeedFactor(*value) : std::nullopt;
-      if (!speed && !asFastAsPossible) {
-        std::cerr << "norvo: --speed wants a number above 0 or \"max\"\n";
-        return std::nullopt;
-      }
-      options.replay.speed = speed;
-      options.replayTuned = true;
-      ++i;
-    } else if (argument == "--loop") {
-      options.replay.loop = true;
-      options.replayTuned = true;
-    } else {
-      std::cerr << "norvo: unknown option " << argument << "\n\n" << kViewerUsage;
-      return std::nullopt;
-    }
+  if (listen) {
+    const auto endpoint = ui::web::parseListenAddress(*listen);
+    if (!endpoint) return refuse("--listen wants an address and a port, such as 127.0.0.1:8080");
+    options.display.listen = *endpoint;
   }
-  if (options.replayPath && options.service.bus) {
-    std::cerr << "norvo: --replay goes with the built-in service; on D-Bus, run\n"
-                 "       tarnd --source replay:LOG.jsonl\n";
-    return std::nullopt;
+  if (service) {
+    const auto choice = parseServiceChoice(*service);
+    if (!choice) return refuse("--service wants builtin, dbus, dbus:system or dbus:ADDRESS");
+    options.service = *choice;
   }
-  if (options.replayTuned && !options.replayPath) {
-    std::cerr << "norvo: --speed and --loop go with --replay\n";
-    return std::nullopt;
+  if (speed == "max") {
+    options.replay.speed = std::nullopt;
+  } else if (speed) {
+    options.replay.speed = platform::parseSpeedFactor(*speed);
+    if (!options.replay.speed) return refuse("--speed wants a number above 0 or \"max\"");
   }
+  options.replay.loop = loop;
+  if (replay && options.service.bus) {
+    return refuse(
+        "--replay goes with the built-in service; on D-Bus, run\n"
+        "       tarnd --source replay:LOG.jsonl");
+  }
+  if ((speed || loop) && !replay) return refuse("--speed and --loop go with --replay");
+  if (replay) options.replayPath = std::string(*replay);
   return options;
 }
 
@@ -132,6 +120,10 @@ std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& 
 }  // namespace
 
 int runViewer(std::span<const std::string_view> arguments) {
+  if (platform::asksForHelp(arguments)) {
+    std::cout << kViewerUsage;
+    return 0;
+  }
   std::optional<ViewerOptions> options = parseOptions(arguments);
   if (!options) return 2;
 

@@ -12,42 +12,35 @@ ParsedOptions parse(std::vector<std::string_view> arguments) {
   return parseDaemonOptions(arguments);
 }
 
-TEST(DaemonOptions, WithoutArgumentsServesTheSimulatorOnTheSessionBus) {
-  const ParsedOptions parsed = parse({});
-  ASSERT_TRUE(parsed.options) << parsed.error;
-  const auto* simulator = std::get_if<SimulatorChoice>(&parsed.options->source);
-  ASSERT_TRUE(simulator);
-  EXPECT_EQ(simulator->seed, 1u);
-  EXPECT_EQ(simulator->speed, 1.0);
-  EXPECT_EQ(parsed.options->bus, "session");
-  EXPECT_FALSE(parsed.options->recordPath);
-  EXPECT_FALSE(parsed.options->help);
-}
+TEST(DaemonOptions, ServesTheSimulatorOnTheSessionBusUnlessToldOtherwise) {
+  const ParsedOptions defaults = parse({});
+  ASSERT_TRUE(defaults.options) << defaults.error;
+  EXPECT_EQ(std::get<SimulatorChoice>(defaults.options->source).seed, 1u);
+  EXPECT_EQ(std::get<SimulatorChoice>(defaults.options->source).speed, 1.0);
+  EXPECT_EQ(defaults.options->bus, "session");
+  EXPECT_FALSE(defaults.options->recordPath);
 
-TEST(DaemonOptions, ReadsTheSimulatorsSeedAndSpeedInAnyOrder) {
   const ParsedOptions parsed = parse({"--speed", "60", "--seed", "18446744073709551615", "--source",
                                       "sim", "--bus", "system", "--record", "out.jsonl"});
   ASSERT_TRUE(parsed.options) << parsed.error;
-  const auto& simulator = std::get<SimulatorChoice>(parsed.options->source);
-  EXPECT_EQ(simulator.seed, 18446744073709551615u);
-  EXPECT_EQ(simulator.speed, 60.0);
+  EXPECT_EQ(std::get<SimulatorChoice>(parsed.options->source).seed, 18446744073709551615u);
+  EXPECT_EQ(std::get<SimulatorChoice>(parsed.options->source).speed, 60.0);
   EXPECT_EQ(parsed.options->bus, "system");
   EXPECT_EQ(parsed.options->recordPath, "out.jsonl");
 }
 
 TEST(DaemonOptions, ReadsAReplayWithItsPaceAndLoop) {
-  struct Case {
+  const struct {
     std::vector<std::string_view> arguments;
     std::optional<double> speed;
     bool loop;
-  };
-  const Case cases[] = {
+  } cases[] = {
       {{"--source", "replay:drive.jsonl", "--bus", "unix:path=/run/user/1000/bus"}, 1.0, false},
       {{"--source", "replay:drive.jsonl", "--speed", "0.5", "--loop"}, 0.5, true},
       {{"--as-fast-as-possible", "--source", "replay:drive.jsonl"}, std::nullopt, false},
       {{"--source", "replay:drive.jsonl", "--speed", "max"}, std::nullopt, false},
   };
-  for (const Case& each : cases) {
+  for (const auto& each : cases) {
     const ParsedOptions parsed = parse(each.arguments);
     ASSERT_TRUE(parsed.options) << parsed.error;
     const auto& replay = std::get<ReplayChoice>(parsed.options->source);
@@ -58,21 +51,12 @@ TEST(DaemonOptions, ReadsAReplayWithItsPaceAndLoop) {
   EXPECT_EQ(parse(cases[0].arguments).options->bus, "unix:path=/run/user/1000/bus");
 }
 
-TEST(DaemonOptions, HelpWinsOverOtherwiseWrongCombinations) {
-  const ParsedOptions parsed = parse({"--seed", "x", "--help"});
-  ASSERT_TRUE(parsed.options) << parsed.error;
-  EXPECT_TRUE(parsed.options->help);
-}
-
-TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhich) {
-  struct Case {
+TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp) {
+  const struct {
     std::vector<std::string_view> arguments;
     std::string_view error;
-  };
-  const Case cases[] = {
-      {{"--source"}, "--source needs a value"},
+  } cases[] = {
       {{"--source", "replay:"}, "--source wants sim or replay:FILE.jsonl, not replay:"},
-      {{"--source", "radio"}, "--source wants sim or replay:FILE.jsonl, not radio"},
       {{"--seed", "-1"}, "--seed wants a whole number of at least 0"},
       {{"--seed", "18446744073709551616"}, "--seed wants a whole number of at least 0"},
       {{"--speed", "0"}, "--speed wants a number above 0"},
@@ -84,13 +68,14 @@ TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhich) {
       {{"--bus", "user"},
        "--bus wants session, system or a D-Bus address such as unix:path=/run/user/1000/bus"},
       {{"--record", ""}, "--record needs a file name"},
-      {{"--verbose"}, "unknown option --verbose"},
       {{"sim"}, "unexpected argument sim"},
   };
-  for (const Case& each : cases) {
-    const ParsedOptions parsed = parse(each.arguments);
-    EXPECT_FALSE(parsed.options) << each.error;
-    EXPECT_EQ(parsed.error, each.error);
+  for (auto [arguments, error] : cases) {
+    const ParsedOptions parsed = parse(arguments);
+    EXPECT_FALSE(parsed.options) << error;
+    EXPECT_EQ(parsed.error, error);
+    arguments.push_back("--help");
+    EXPECT_TRUE(parse(arguments).options.value_or(DaemonOptions{}).help) << error;
   }
 }
 

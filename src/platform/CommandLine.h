@@ -1,0 +1,43 @@
+#pragma once
+
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <variant>
+
+// The shape of a command line: options, flags and at most one positional argument. What the
+// values mean, and which options go together, each command judges for itself afterwards.
+namespace platform {
+
+// An option of a command: a flag, set when given, or an option whose value is the next argument,
+// whatever it looks like, so that "--seed -1" reaches the command's own check.
+struct CommandLineOption {
+  std::string_view name;
+  std::variant<bool*, std::optional<std::string_view>*> given;
+  // Says what the value is when it is missing: "--replay needs a metric log".
+  std::string_view valueName = "a value";
+};
+
+// The one argument of a command that is not an option, such as the file it works on. "-" counts
+// as one, for standard input.
+struct CommandLinePositional {
+  std::optional<std::string_view>* given;
+  // Names it when a second one comes: "one metric log at a time, not also b.jsonl".
+  std::string_view noun;
+  // The whole message when it is missing, such as "which metric log?".
+  std::string_view whenMissing;
+};
+
+// Fills in the targets of the options and of the positional, which must be unset on entry, from
+// `arguments`; a repeated option keeps its last value. Answers what is wrong with their shape in
+// one line, or an empty text.
+[[nodiscard]] std::string readCommandLine(std::span<const std::string_view> arguments,
+                                          std::span<const CommandLineOption> options,
+                                          std::optional<CommandLinePositional> positional = {});
+
+// True when "--help" or "-h" is among the arguments: the command then shows its usage, whatever
+// else the arguments hold.
+bool asksForHelp(std::span<const std::string_view> arguments);
+
+}  // namespace platform

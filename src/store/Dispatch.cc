@@ -33,8 +33,8 @@ class StepRunner {
   }
 
   void operator()(const LogDisplayDictionary&) const {
-    std::string line = display_.description();
-    line.insert(0, handler_.logPrefix);
+    std::string line(handler_.logPrefix);
+    platform::appendDescription(line, display_);
     platform::log::plain(line);
   }
 

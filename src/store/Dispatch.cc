@@ -83,6 +83,27 @@ class StepRunner {
   const TimestampFormatter& formatTimestamp_;
 };
 
+// A metric's list elements carry its own time, so within one metric the text of a time is
+// made once.
+class LastTimestampText {
+ public:
+  explicit LastTimestampText(const TimestampFormatter& formatTimestamp)
+      : formatTimestamp_(formatTimestamp) {}
+
+  std::optional<std::string> operator()(double milliseconds) {
+    if (lastTime_ != milliseconds) {
+      lastText_ = formatTimestamp_(milliseconds);
+      lastTime_ = milliseconds;
+    }
+    return lastText_;
+  }
+
+ private:
+  const TimestampFormatter& formatTimestamp_;
+  std::optional<double> lastTime_;
+  std::optional<std::string> lastText_;
+};
+
 const std::unordered_map<std::int64_t, const Handler*>& handlersByMetricID() {
   static const auto* const handlers = [] {
     auto* byID = new std::unordered_map<std::int64_t, const Handler*>;
@@ -109,7 +130,12 @@ bool runHandler(const Handler& handler, const platform::Bytes* payload, DisplayS
   if (!decoded) return false;
   std::optional<Dictionary>& stored = store[handler.display];
   stored = std::move(decoded);
-  const StepRunner runStep(handler, *stored, store, formatTimestamp);
+  LastTimestampText lastText(formatTimestamp);
+  // Holds a reference only, so it needs no allocation.
+  const TimestampFormatter formatEachTimeOnce = [&lastText](double milliseconds) {
+    return lastText(milliseconds);
+  };
+  const StepRunner runStep(handler, *stored, store, formatEachTimeOnce);
   for (const HandlerStep& step : handler.steps)
     std::visit(runStep, step);
   return true;

@@ -52,18 +52,19 @@ class StepRunner {
     destination = std::move(refreshed);
   }
 
+  // Each metric of a kind brings rows of much the same shape, so the new rows are written over
+  // the ones they replace and reuse their storage.
   void operator()(const CopyList& step) const {
     const platform::Value* source = display_.find(step.key);
     if (source == nullptr || !hasShape(*source, ValueShape::DictionaryList)) return;
     const Dictionary& parent = step.parent(store_, display_);
-    platform::List rows;
-    rows.reserve(source->asList()->size());
-    for (const platform::Value& element : *source->asList()) {
-      const Dictionary& fields = *element.asDictionary();
-      Dictionary row;
-      row.reserve(fields.size() + step.parentKeys.size());
-      for (const auto& [key, value] : fields)
-        row.append(key, value);
+    const platform::List& elements = *source->asList();
+    platform::List& rows = step.destination(store_);
+    rows.resize(elements.size());
+    for (std::size_t i = 0; i < elements.size(); ++i) {
+      if (!rows[i].isDictionary()) rows[i] = Dictionary();
+      Dictionary& row = *rows[i].asDictionary();
+      row = *elements[i].asDictionary();
       for (const std::string_view key : step.parentKeys) {
         if (const platform::Value* inherited = parent.find(key))
           row.set(std::string(key), *inherited);
@@ -71,9 +72,7 @@ class StepRunner {
       for (const EntryConversion& conversion : step.conversions) {
         convertEntry(row, conversion, formatTimestamp_);
       }
-      rows.emplace_back(std::move(row));
     }
-    step.destination(store_) = std::move(rows);
   }
 
  private:

@@ -39,7 +39,7 @@ std::int64_t floorDivide(std::int64_t dividend, std::int64_t divisor) {
 }
 
 // What decides the current time zone: TZ when set, otherwise the system's zone file. Cheap to
-// take on every call, unlike asking ICU to detect the zone.
+// check on every call, unlike asking ICU to detect the zone.
 struct ZoneSource {
   bool tzSet = false;
   std::string tz;
@@ -52,18 +52,29 @@ struct ZoneSource {
     if (const char* tz = std::getenv("TZ")) {
       source.tzSet = true;
       source.tz = tz;
-    } else if (struct stat status{}; stat(kSystemZoneFile, &status) == 0) {
-      source.device = status.st_dev;
-      source.inode = status.st_ino;
-      source.modified = status.st_mtim;
+    } else {
+      source.readZoneFile();
     }
     return source;
   }
 
-  bool operator==(const ZoneSource& other) const {
-    return tzSet == other.tzSet && tz == other.tz && device == other.device &&
-           inode == other.inode && modified.tv_sec == other.modified.tv_sec &&
-           modified.tv_nsec == other.modified.tv_nsec;
+  // Whether this is still the current source; compares TZ in place, without a copy.
+  bool isCurrent() const {
+    const char* tzNow = std::getenv("TZ");
+    if (tzNow != nullptr || tzSet) return tzNow != nullptr && tzSet && tz == tzNow;
+    ZoneSource now;
+    now.readZoneFile();
+    return device == now.device && inode == now.inode && modified.tv_sec == now.modified.tv_sec &&
+           modified.tv_nsec == now.modified.tv_nsec;
+  }
+
+ private:
+  void readZoneFile() {
+    if (struct stat status{}; stat(kSystemZoneFile, &status) == 0) {
+      device = status.st_dev;
+      inode = status.st_ino;
+      modified = status.st_mtim;
+    }
   }
 };
 
@@ -89,9 +100,10 @@ class Formatter {
 
   std::string format(double millisecondsSince1970) {
     // Records often share one time: a list's elements carry their parent's.
-    if (millisecondsSince1970 == lastTime_) return lastText_;
-    lastText_ = textOf(millisecondsSince1970);
-    lastTime_ = millisecondsSince1970;
+    if (millisecondsSince1970 != lastTime_) {
+      writeText(millisecondsSince1970);
+      lastTime_ = millisecondsSince1970;
+    }
     return lastText_;
   }
 
@@ -122,15 +134,19 @@ class Formatter {
     bool finerThanSeconds = false;
   };
 
-  std::string textOf(double millisecondsSince1970) {
+  // Into lastText_, whose storage is reused from one second to the next.
+  void writeText(double millisecondsSince1970) {
     if (reuse_ != Reuse::None && !(minute_ && minute_->holds(millisecondsSince1970))) {
       minute_ = minuteAround(millisecondsSince1970);
     }
-    if (reuse_ == Reuse::None || !minute_) return utf8(formatted(millisecondsSince1970).text);
+    if (reuse_ == Reuse::None || !minute_) {
+      lastText_ = utf8(formatted(millisecondsSince1970).text);
+      return;
+    }
     const auto second = static_cast<std::size_t>(
         (static_cast<std::int64_t>(std::floor(millisecondsSince1970)) - minute_->startMs) /
         kMillisecondsPerSecond);
-    return minute_->before + secondsTexts_[second] + minute_->after;
+    lastText_.assign(minute_->before).append(secondsTexts_[second]).append(minute_->after);
   }
 
   // The local minute that holds the time, formatted and split around its seconds field; empty
@@ -224,9 +240,8 @@ struct CachedFormatter {
   std::string locale;
   std::unique_ptr<Formatter> formatter;
 
-  bool fits(std::string_view wantedPattern, const ZoneSource& wantedZone,
-            const char* wantedLocale) const {
-    return formatter && pattern == wantedPattern && zone == wantedZone && locale == wantedLocale;
+  bool fits(std::string_view wantedPattern, const char* wantedLocale) const {
+    return formatter && pattern == wantedPattern && locale == wantedLocale && zone.isCurrent();
   }
 };
 
@@ -238,12 +253,11 @@ std::optional<std::string> formatDate(double millisecondsSince1970, std::string_
     return std::nullopt;
   }
   thread_local CachedFormatter cached;
-  const ZoneSource zone = ZoneSource::current();
   const icu::Locale& locale = icu::Locale::getDefault();
-  if (!cached.fits(pattern, zone, locale.getName())) {
+  if (!cached.fits(pattern, locale.getName())) {
+    cached.zone = ZoneSource::current();
     cached.formatter = Formatter::make(pattern, locale);
     cached.pattern = pattern;
-    cached.zone = zone;
     cached.locale = locale.getName();
   }
   if (!cached.formatter) return std::nullopt;

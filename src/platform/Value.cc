@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cassert>
 #include <cmath>
+#include <cstring>
 #include <limits>
 #include <type_traits>
 
@@ -95,9 +96,21 @@ Dictionary::Dictionary(std::initializer_list<Entry> entries) {
     set(entry.first, entry.second);
 }
 
+namespace {
+
+// The keys of a record often share their length ("rsrp0", "sinr1"), so their first and last
+// characters are compared before the whole.
+bool sameKey(std::string_view key, std::string_view other) {
+  return key.size() == other.size() &&
+         (key.empty() || (key.front() == other.front() && key.back() == other.back() &&
+                          std::memcmp(key.data(), other.data(), key.size()) == 0));
+}
+
+}  // namespace
+
 const Value* Dictionary::find(std::string_view key) const {
   for (const Entry& entry : entries_) {
-    if (entry.first == key) return &entry.second;
+    if (sameKey(entry.first, key)) return &entry.second;
   }
   return nullptr;
 }
@@ -121,7 +134,7 @@ void Dictionary::append(std::string key, Value value) {
 
 bool Dictionary::erase(std::string_view key) {
   const auto found = std::find_if(entries_.begin(), entries_.end(),
-                                  [key](const Entry& entry) { return entry.first == key; });
+                                  [key](const Entry& entry) { return sameKey(entry.first, key); });
   if (found == entries_.end()) return false;
   entries_.erase(found);
   return true;

@@ -203,6 +203,10 @@ class Value {
 // The text form of a list, as inside Value::description.
 std::string description(const List& list);
 
+// Appends the text form, as description() gives it, to `out`, growing it once.
+void appendDescription(std::string& out, const Value& value);
+void appendDescription(std::string& out, const Dictionary& dictionary);
+
 inline std::size_t Dictionary::size() const {
   return entries_.size();
 }

@@ -196,6 +196,40 @@ TEST(AValueDescription, PrintsFloatsInTheirShortestFormWithAFractionalPart) {
   EXPECT_EQ(Value(-std::nan("")).description(), "nan");
 }
 
+TEST(AValueDescription, EscapesAQuoteOrBackslashWhereverItStandsInTextOfAnyLength) {
+  for (std::size_t length = 1; length <= 24; ++length) {
+    for (std::size_t position = 0; position < length; ++position) {
+      for (const char escaped : {'"', '\\'}) {
+        // Neighbours of both characters in the code table, and a UTF-8 sequence.
+        std::string text = std::string("!#[]\xc3\xa9xyz0123456789ABCDEFGHIJ").substr(0, length);
+        text[position] = escaped;
+        std::string quoted = text;
+        quoted.insert(position, 1, '\\');
+        EXPECT_EQ(Value(List{text}).description(), "[\"" + quoted + "\"]") << text;
+        EXPECT_EQ(Dictionary({{text, 1}}).description(), "[\"" + quoted + "\": 1]") << text;
+      }
+    }
+  }
+}
+
+TEST(AValueDescription, WritesTextThatIsAllEscapesAndTheLongestNumbersInFull) {
+  EXPECT_EQ(Value(Dictionary{{"\"\"", List{"\\\\\\", ""}}}).description(),
+            R"(["\"\"": ["\\\\\\", ""]])");
+  EXPECT_EQ(
+      Value(
+          List{std::numeric_limits<std::int32_t>::min(), std::numeric_limits<std::uint32_t>::max(),
+               std::numeric_limits<std::int64_t>::min(), std::numeric_limits<std::uint64_t>::max()})
+          .description(),
+      "[-2147483648, 4294967295, -9223372036854775808, 18446744073709551615]");
+  EXPECT_EQ(Value(List{-std::numeric_limits<double>::min(), -std::numeric_limits<double>::max(),
+                       -std::numeric_limits<double>::denorm_min(), -0.00012345678901234567,
+                       123456789012345680.0, -std::numeric_limits<float>::min(),
+                       -std::numeric_limits<float>::max()})
+                .description(),
+            "[-2.2250738585072014e-308, -1.7976931348623157e+308, -5e-324, "
+            "-0.00012345678901234567, 123456789012345680.0, -1.1754944e-38, -3.4028235e+38]");
+}
+
 TEST(AValueDescription, WritesBytesInGroupsOfFourInHexadecimal) {
   EXPECT_EQ(Value(Bytes{0x0a, 0x1b, 0x2c, 0x3d, 0x4e}).description(), "<0a1b2c3d 4e>");
   EXPECT_EQ(Value(Bytes{0xff, 0, 0, 1}).description(), "<ff000001>");

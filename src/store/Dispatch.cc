@@ -33,8 +33,8 @@ class StepRunner {
   }
 
   void operator()(const LogDisplayDictionary&) const {
-    std::string line = display_.description();
-    line.insert(0, handler_.logPrefix);
+    std::string line(handler_.logPrefix);
+    platform::appendDescription(line, display_);
     platform::log::plain(line);
   }
 
@@ -52,18 +52,19 @@ class StepRunner {
     destination = std::move(refreshed);
   }
 
+  // Each metric of a kind brings rows of much the same shape, so the new rows are written over
+  // the ones they replace and reuse their storage.
   void operator()(const CopyList& step) const {
     const platform::Value* source = display_.find(step.key);
     if (source == nullptr || !hasShape(*source, ValueShape::DictionaryList)) return;
     const Dictionary& parent = step.parent(store_, display_);
-    platform::List rows;
-    rows.reserve(source->asList()->size());
-    for (const platform::Value& element : *source->asList()) {
-      const Dictionary& fields = *element.asDictionary();
-      Dictionary row;
-      row.reserve(fields.size() + step.parentKeys.size());
-      for (const auto& [key, value] : fields)
-        row.append(key, value);
+    const platform::List& elements = *source->asList();
+    platform::List& rows = step.destination(store_);
+    rows.resize(elements.size());
+    for (std::size_t i = 0; i < elements.size(); ++i) {
+      if (!rows[i].isDictionary()) rows[i] = Dictionary();
+      Dictionary& row = *rows[i].asDictionary();
+      row = *elements[i].asDictionary();
       for (const std::string_view key : step.parentKeys) {
         if (const platform::Value* inherited = parent.find(key))
           row.set(std::string(key), *inherited);
@@ -71,9 +72,7 @@ class StepRunner {
       for (const EntryConversion& conversion : step.conversions) {
         convertEntry(row, conversion, formatTimestamp_);
       }
-      rows.emplace_back(std::move(row));
     }
-    step.destination(store_) = std::move(rows);
   }
 
  private:
@@ -81,6 +80,27 @@ class StepRunner {
   Dictionary& display_;
   DisplayStore& store_;
   const TimestampFormatter& formatTimestamp_;
+};
+
+// A metric's list elements carry its own time, so within one metric the text of a time is
+// made once.
+class LastTimestampText {
+ public:
+  explicit LastTimestampText(const TimestampFormatter& formatTimestamp)
+      : formatTimestamp_(formatTimestamp) {}
+
+  std::optional<std::string> operator()(double milliseconds) {
+    if (lastTime_ != milliseconds) {
+      lastText_ = formatTimestamp_(milliseconds);
+      lastTime_ = milliseconds;
+    }
+    return lastText_;
+  }
+
+ private:
+  const TimestampFormatter& formatTimestamp_;
+  std::optional<double> lastTime_;
+  std::optional<std::string> lastText_;
 };
 
 const std::unordered_map<std::int64_t, const Handler*>& handlersByMetricID() {
@@ -109,7 +129,12 @@ bool runHandler(const Handler& handler, const platform::Bytes* payload, DisplayS
   if (!decoded) return false;
   std::optional<Dictionary>& stored = store[handler.display];
   stored = std::move(decoded);
-  const StepRunner runStep(handler, *stored, store, formatTimestamp);
+  LastTimestampText lastText(formatTimestamp);
+  // Holds a reference only, so it needs no allocation.
+  const TimestampFormatter formatEachTimeOnce = [&lastText](double milliseconds) {
+    return lastText(milliseconds);
+  };
+  const StepRunner runStep(handler, *stored, store, formatEachTimeOnce);
   for (const HandlerStep& step : handler.steps)
     std::visit(runStep, step);
   return true;

@@ -132,6 +132,34 @@ TEST_F(LteConversionTest, CopiesTxPowerReportsAsTheyAre) {
                   Dictionary{{"pusch_tx_power", 23}, {"timestamp", kJuly14Text}}}));
 }
 
+TEST_F(LteConversionTest, EachMetricsRowsReplaceTheLastOnesWhateverTheirCountAndKeys) {
+  KCellularLteRsrpRsrqSinr first;
+  first.setTimestamp(kJuly14);
+  for (const std::int32_t sinr : {25, 4}) {
+    auto sample = std::make_shared<RsrpRsrqSinr>();
+    sample->setSinr0(sinr);
+    sample->setRsrp0(-90);
+    first.addInstValues(sample);
+  }
+  deliver(V::K_LTE_RSRP_RSRQ_SINR, first);
+
+  KCellularLteRsrpRsrqSinr second;
+  second.setTimestamp(kJuly14 + 61000);
+  auto sample = std::make_shared<RsrpRsrqSinr>();
+  sample->setPhyCellId(498);
+  second.addInstValues(sample);
+  deliver(V::K_LTE_RSRP_RSRQ_SINR, second);
+  EXPECT_EQ(validator.myLTE().RsrpRsrqSinr,
+            (List{Dictionary{{"phy_cell_id", 498u}, {"timestamp", "2017-07-14 02:41:01 UTC"}}}));
+  // The rows are written over, never the display dictionary's elements they come from.
+  EXPECT_FALSE(validator.myLTERsrpRsrqSinrDict()
+                   ->find("inst_values")
+                   ->asList()
+                   ->front()
+                   .asDictionary()
+                   ->contains("timestamp"));
+}
+
 class LteCarrierAggregationTest : public LteConversionTest {
  protected:
   static KCellularLteCarrierAggregationStatus status(std::int32_t rsrp, std::uint32_t bandwidth) {

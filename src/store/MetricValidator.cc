@@ -52,7 +52,7 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     platform::log::plain("The metric record has no integer \"kKeyMetricID\"; nothing to do");
     return false;
   }
-  platform::log::plain("Metric ID in Hex = " + platform::format("%2X", *metricID_));
+  platform::log::plainf("Metric ID in Hex = %2X", *metricID_);
 
   const Handler* handler = handlerFor(*metricID_);
   if (handler == nullptr) {

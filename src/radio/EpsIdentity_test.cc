@@ -3,7 +3,6 @@
 #include <gtest/gtest.h>
 
 #include "platform/Value.h"
-
 namespace radio {
 namespace {
 

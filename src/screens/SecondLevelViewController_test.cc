@@ -2,13 +2,11 @@
 
 #include <gtest/gtest.h>
 
-#include <map>
 
 #include "platform/Log.h"
 #include "platform/MainQueue.h"
 #include "screens/FirstLevelViewController.h"
 #include "screens/NorvoViewController.h"
-#include "store/DisplayDictionaries.h"
 #include "ui/StoryboardSegue.h"
 
 namespace {
@@ -166,120 +164,6 @@ TEST_F(TheDetailScreen, AsksToComeBackLaterForCategoriesWithoutData) {
       ui::TableViewCell("SecondClickView", ui::CellStyle::RightDetail));
   unchosen.tableView().reloadData();
   EXPECT_EQ(unchosen.tableView().cellForRow({0, 0})->textLabel()->text, "Come back later");
-}
-
-// Each store member holds entries naming that member, so a category reading the wrong member,
-// or titling its sections wrongly, shows up by its key.
-TEST_F(TheDetailScreen, ShowsForEveryCategoryTheStoreMemberItNames) {
-#define NORVO_MARK(name) validator.setMy##name##Dict(Dictionary{{"source", "my" #name "Dict"}});
-  NORVO_DISPLAY_DICTIONARIES(NORVO_MARK)
-#undef NORVO_MARK
-  const auto marked = [](const std::string& source) {
-    return List{Dictionary{{"source", source + " 0"}}, Dictionary{{"source", source + " 1"}}};
-  };
-  store::LTE lte;
-  lte.SelReselCellInfo = Dictionary{{"source", "myLTE.SelReselCellInfo"}};
-  lte.EutraNbrs = marked("myLTE.EutraNbrs");
-  lte.RsrpRsrqSinr = marked("myLTE.RsrpRsrqSinr");
-  lte.TxPower = marked("myLTE.TxPower");
-  lte.EutraNbrsMeas = marked("myLTE.EutraNbrsMeas");
-  lte.UtraNbrsMeas = marked("myLTE.UtraNbrsMeas");
-  lte.GeraNbrsMeas = marked("myLTE.GeraNbrsMeas");
-  lte.CAStatusList = marked("myLTE.CAStatusList");
-  lte.SecondaryCellMeasList = marked("myLTE.SecondaryCellMeasList");
-  validator.setMyLTE(lte);
-  store::UMTS umts;
-  umts.SelReselCellInfo = Dictionary{{"source", "myUMTS.SelReselCellInfo"}};
-  umts.rXInfo = marked("myUMTS.rXInfo");
-  umts.TxPower = marked("myUMTS.TxPower");
-  umts.eUtraNbrs = marked("myUMTS.eUtraNbrs");
-  umts.utraNbrs = marked("myUMTS.utraNbrs");
-  umts.geraNbrs = marked("myUMTS.geraNbrs");
-  umts.eUtraNbrMeas = marked("myUMTS.eUtraNbrMeas");
-  umts.utraNbrMeas = marked("myUMTS.utraNbrMeas");
-  umts.geraNbrMeas = marked("myUMTS.geraNbrMeas");
-  validator.setMyUMTS(umts);
-  store::GSM gsm;
-  gsm.eUtraNbrMeas = marked("myGSM.eUtraNbrMeas");
-  gsm.utraNbrMeas = marked("myGSM.utraNbrMeas");
-  gsm.geraNbrMeas = marked("myGSM.geraNbrMeas");
-  validator.setMyGSM(gsm);
-  store::Common common;
-  common.activeBearer = marked("myCommon.activeBearer");
-  common.simContents = marked("myCommon.simContents");
-  validator.setMyCommon(common);
-
-  // One headerless section of the dictionary's entries.
-  const auto whole = [](const std::string& source) {
-    return std::vector<Section>{{std::nullopt, {{"source", source}}}};
-  };
-  // A section per element, titled by `prefix` and the element's index.
-  const auto each = [](const std::string& source, const std::string& prefix) {
-    return std::vector<Section>{{prefix + "0", {{"source", source + " 0"}}},
-                                {prefix + "1", {{"source", source + " 1"}}}};
-  };
-  // Element 0 alone, in one section titled section 0 if titled at all.
-  const auto first = [](const std::string& source, std::optional<std::string> header) {
-    return std::vector<Section>{{header, {{"source", source + " 0"}}}};
-  };
-  const std::map<std::string, std::vector<Section>> expected{
-      {"Device Info IMSI", kComeBackLater},
-      {"Device Info IMEISV", kComeBackLater},
-      {"Device Info SIM Files", first("myCommon.simContents", "SIM Content 0")},
-      {"LTE NAS", whole("myLTEEMMContextDict")},
-      {"LTE RRC State", whole("myLTERRCStateDict")},
-      {"LTE Serving Cell Info", whole("myLTESCellInfoDict")},
-      {"LTE Serving Cell Meas", first("myLTE.RsrpRsrqSinr", std::nullopt)},
-      {"LTE Tx Power", each("myLTE.TxPower", "TxPowerInfo ")},
-      {"LTE Sel Resel Parameters", whole("myLTE.SelReselCellInfo")},
-      {"LTE EUTRA Neighbor Info", each("myLTE.EutraNbrs", "EUTRA Neighbor ")},
-      {"LTE C-DRX", whole("myLTECDRXConfigDict")},
-      {"LTE LTE Neighbor Cell Meas", each("myLTE.EutraNbrsMeas", "LTE Neighbor ")},
-      {"LTE UMTS Neighbor Cell Meas", each("myLTE.UtraNbrsMeas", "UMTS Neighbor ")},
-      {"LTE GSM Neighbor Cell Meas", each("myLTE.GeraNbrsMeas", "GSM Neighbor ")},
-      {"LTE CA Status", each("myLTE.CAStatusList", "Component Carrier ")},
-      {"LTE Secondary Cell Meas", each("myLTE.SecondaryCellMeasList", "Secondary Cell Meas ")},
-      {"LTE Active Bearers", each("myCommon.activeBearer", "PDP ")},
-      {"UMTS NAS GMM", whole("myGMMContextDict")},
-      {"UMTS NAS MM", whole("myMMContextDict")},
-      {"UMTS RRC State", whole("myUMTSRRCStateDict")},
-      {"UMTS RRC Configuration", whole("myUMTSRRCConfigDict")},
-      {"UMTS Serving Cell Info", whole("myUMTSCellInfoDict")},
-      {"UMTS Serving Cell Meas", each("myUMTS.rXInfo", "RxInfo ")},
-      {"UMTS Tx Power", each("myUMTS.TxPower", "TxPowerInfo ")},
-      {"UMTS Sel Resel Parameters", whole("myUMTS.SelReselCellInfo")},
-      {"UMTS EUTRA Neighbor Info", each("myUMTS.eUtraNbrs", "EUTRA Neighbor ")},
-      {"UMTS UTRA Neighbor Info", each("myUMTS.utraNbrs", "UTRA Neighbor ")},
-      {"UMTS GSM Neighbor Info", each("myUMTS.geraNbrs", "GSM Neighbor ")},
-      {"UMTS LTE Neighbor Cell Meas", each("myUMTS.eUtraNbrMeas", "LTE Neighbor ")},
-      {"UMTS UMTS Neighbor Cell Meas", each("myUMTS.utraNbrMeas", "UMTS Neighbor ")},
-      {"UMTS GSM Neighbor Cell Meas", each("myUMTS.geraNbrMeas", "GSM Neighbor ")},
-      {"UMTS Active Bearers", each("myCommon.activeBearer", "PDP ")},
-      {"GSM NAS GMM", whole("myGMMContextDict")},
-      {"GSM NAS MM", whole("myMMContextDict")},
-      {"GSM Serving Cell Info", whole("myGSMScellInfoDict")},
-      {"GSM Idle Config", whole("myGSMIdleConfigInfoDict")},
-      {"GSM Idle Serv Cell Meas", whole("myGSMIdleScellMeasDict")},
-      {"GSM Connected Serv Cell Meas", whole("myGSMConnRfMeasDict")},
-      {"GSM GSM GPRS Config", whole("myGSMGPRSConfigDict")},
-      {"GSM LTE Neighbor Cell Meas", each("myGSM.eUtraNbrMeas", "LTE Neighbor ")},
-      {"GSM UMTS Neighbor Cell Meas", each("myGSM.utraNbrMeas", "UMTS Neighbor ")},
-      {"GSM GSM Neighbor Cell Meas", each("myGSM.geraNbrMeas", "GSM Neighbor ")},
-      {"GSM Active Bearers", each("myCommon.activeBearer", "PDP ")},
-  };
-
-  // Through the menus' own names, so that every item the user can tap is covered.
-  const NorvoViewItems& items = NorvoViewItems::shared();
-  std::size_t keys = 0;
-  for (const std::string& launch : items.launchViewItemNames())
-    for (const std::string& item : items.firstLevelViewItems().at(launch)) {
-      const std::string key = launch + " " + item;
-      ++keys;
-      const auto found = expected.find(key);
-      ASSERT_NE(found, expected.end()) << key;
-      EXPECT_EQ(show(launch, item), found->second) << key;
-    }
-  EXPECT_EQ(keys, expected.size());
 }
 
 TEST_F(TheDetailScreen, ShowsNothingForRowsTheStoreNoLongerHas) {

@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-
 #include "platform/Log.h"
 #include "platform/MainQueue.h"
 #include "screens/FirstLevelViewController.h"

@@ -117,6 +117,7 @@ void Follower::askForObjects() {
           for (const auto& [interface, raw] : interfaces)
             objects_[path][interface] = dictOf(raw);
         }
+        present_ = true;
         follow();
       },
       kCallTimeout);
@@ -132,6 +133,7 @@ void Follower::ownerChanged(sdbus::Message& signal) {
   objects_.clear();
   proxies_.clear();
   cells_.clear();
+  present_ = false;
   if (newOwner.empty()) {
     say("ModemManager has left the bus; waiting for it to return");
     follow();
@@ -200,8 +202,10 @@ void Follower::propertiesChanged(sdbus::Message& signal) {
 }
 
 void Follower::follow() {
+  // The modem followed stays followed while it is there.
+  const auto followed = modem_ ? objects_.find(*modem_) : objects_.end();
+  if (followed != objects_.end() && followed->second.contains(kModemInterface)) return;
   const std::optional<std::string> chosen = chooseModem(objects_, options_.modem);
-  if (chosen == modem_) return;
   if (modem_) say(platform::format("modem %s has gone away", modemIndex(*modem_)));
   modem_ = chosen;
   cells_.clear();
@@ -209,12 +213,15 @@ void Follower::follow() {
   lastState_.clear();
   problemsSaid_.clear();
   if (!modem_) {
-    if (objects_.empty()) return;  // said why already
-    say(options_.modem.empty()
-            ? "ModemManager has no modem; waiting for one"
-            : "ModemManager has no modem " + options_.modem + "; waiting for it");
+    const std::string waiting =
+        options_.modem.empty() ? "ModemManager has no modem; waiting for one"
+                               : "ModemManager has no modem " + options_.modem + "; waiting for it";
+    // Said once while ModemManager is there without the modem.
+    if (present_ && waiting != lastWaiting_) say(waiting);
+    lastWaiting_ = present_ ? waiting : std::string();
     return;
   }
+  lastWaiting_.clear();
   const Dict& modem = properties(*modem_, kModemInterface);
   std::string identity = text(modem, property::kModel);
   const std::string imei = text(modem, property::kEquipmentIdentifier);

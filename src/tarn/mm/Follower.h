@@ -74,11 +74,13 @@ class Follower {
   std::map<std::string, std::unique_ptr<sdbus::IProxy>> proxies_;
   std::vector<sdbus::Slot> matches_;
   Objects objects_;
+  bool present_ = false;  // ModemManager has answered with its objects
   std::optional<std::string> modem_;
   std::vector<Dict> cells_;
   bool cellsRefused_ = false;
   bool hadBearers_ = false;
   std::string lastState_;
+  std::string lastWaiting_;
   std::set<std::string> problemsSaid_;
 };
 

@@ -1,10 +1,12 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "client/TarnWrapperDelegate.h"
 #include "platform/Value.h"
@@ -116,6 +118,15 @@ class MetricValidator : public TarnWrapperDelegate {
   // decode; the store then keeps what it had.
   virtual bool isMetricIDValidWithMetricdict(const platform::Dictionary& metric);
 
+  // Told after each metric that changed the store, in the order added, which display dictionary
+  // the metric replaced; the store is converted by then. What keeps data derived from the store
+  // (the graphs' series) is added by the app, so the store knows nothing of it.
+  using StoreObserver =
+      std::function<void(DisplayDictionary replaced, const MetricValidator& store)>;
+  void addStoreObserver(StoreObserver observer) {
+    storeObservers_.push_back(std::move(observer));
+  }
+
   // "yyyy-MM-dd HH:mm:ss zzz" in the current time zone and locale; fractions of a second are
   // dropped. Empty when the time cannot be shown as a date.
   virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
@@ -124,6 +135,7 @@ class MetricValidator : public TarnWrapperDelegate {
   TarnWrapper* const mySharedTarnInstance_;
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
+  std::vector<StoreObserver> storeObservers_;
 };
 
 }  // namespace store

@@ -141,11 +141,14 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
   }));
 
   // The SIM is reported.
-  fake.addSim(0, {{"OperatorName", property(std::string("Norvo"))}});
+  fake.addSim(0, {{"SimIdentifier", property(std::string("8931041010654378930"))},
+                  {"Imsi", property(std::string("310410123456789"))},
+                  {"OperatorName", property(std::string("Norvo"))}});
   fake.set(modem, mm::kModemInterface,
            {{"Sim", property(sdbus::ObjectPath(FakeModemManager::simPath(0)))}});
   ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return firstRow(store.myCommon().simContents, "ef_id") == 0x6F46;
+    return store.myCommon().simContents.size() == 3 &&
+           firstRow(store.myCommon().simContents, "ef_id") == 0x2FE2;
   }));
 }
 

@@ -127,6 +127,12 @@ TEST_F(ModemManagerIntakeTest, ShowsAnLteModemsValuesAsModemManagerReportedThem)
   };
   for (const Shown& value : shown)
     EXPECT_EQ(value.read(validator), value.expected) << value.what;
+  EXPECT_EQ(numberIn(validator.myLTESCellInfoDict(), "freq_band_ind"), 3) << "EARFCN 1300";
+  EXPECT_EQ(number(row(validator.myLTE().EutraNbrsMeas, 0), "freq_band_ind"), 20) << "EARFCN 6300";
+  // The serving cell's tracking area, its PLMN 210-34 in NAS's three bytes.
+  const platform::Value* tai = validator.myLTEEMMContextDict()->find("tai_list");
+  ASSERT_NE(tai, nullptr);
+  EXPECT_THAT(*tai->asString(), ::testing::HasSubstr("\"tac\": 33997"));
   const platform::Value* status = validator.myLTEEMMContextDict()->find("reg_status");
   ASSERT_NE(status, nullptr);
   EXPECT_EQ(*status->asString(), "KREG_STATUS_NORMAL_SERVICE");
@@ -148,6 +154,7 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
   lte.rsrp = -110;
   lte.rsrq = -16;
   Cell neighbour = cell(Rat::Umts, false);
+  neighbour.channel = 10713;
   neighbour.rscp = -101;
   neighbour.ecio = -12.5;
   umts.cells = {serving, lte, neighbour};
@@ -172,6 +179,8 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
 
   const Shown shown[] = {
       {"UMTS PSC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "psc"); }, 300},
+      {"UMTS neighbour band",
+       inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "band"), 1},
       {"UMTS UARFCN", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "dl_uarfcn"); }, 10700},
       {"UMTS LAC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "lac"); }, 0x1F},
       {"UMTS MNC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "mnc"); }, 410},
@@ -209,6 +218,9 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
   };
   for (const Shown& value : shown)
     EXPECT_EQ(value.read(validator), value.expected) << value.what;
+  EXPECT_EQ(*validator.myUMTSCellInfoDict()->find("wcdma_band")->asString(),
+            "SYS_BAND_WCDMA_I_IMT_2000");
+  EXPECT_EQ(*validator.myGSMScellInfoDict()->find("gsm_band")->asString(), "SYS_BAND_GSM_PGSM_900");
 }
 
 TEST_F(ModemManagerIntakeTest, MakesNoRecordOfWhatModemManagerDoesNotReport) {

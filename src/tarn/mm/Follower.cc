@@ -281,8 +281,11 @@ void Follower::readProperties(const std::string& path, std::string_view interfac
         Problems problems;
         const Sim sim = readSim(objects_[path][interface], problems);
         report(problems);
-        if (std::optional<service::Metric> files = simFilesMetric(sim, hooks_.clock()))
+        const std::uint64_t now = hooks_.clock();
+        if (std::optional<service::Metric> files = simFilesMetric(sim, now))
           hooks_.simFiles(std::move(*files));
+        if (std::optional<service::Metric> common = mmCommonInfoMetric(sim, now))
+          hooks_.deliver(std::move(*common));
       },
       kCallTimeout);
 }

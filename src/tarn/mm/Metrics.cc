@@ -8,6 +8,10 @@
 
 #include "messages/Records.h"
 #include "platform/Format.h"
+#include "radio/GsmBands.h"
+#include "radio/LteBands.h"
+#include "radio/Plmn.h"
+#include "radio/UmtsBands.h"
 #include "tarn/mm/BasebandUnits.h"
 #include "tarn/sim/MetricIds.h"
 
@@ -136,6 +140,73 @@ std::optional<RegStatus> regStatus(const std::optional<std::uint32_t>& state) {
   return std::nullopt;
 }
 
+// The operating band of a channel number, from the 3GPP tables of src/radio.
+std::optional<std::uint32_t> lteBand(const std::optional<std::uint32_t>& earfcn) {
+  if (!earfcn) return std::nullopt;
+  const std::optional<radio::LteChannel> channel = radio::decodeEarfcn(*earfcn);
+  return channel ? std::optional(channel->band) : std::nullopt;
+}
+
+std::optional<std::uint32_t> umtsBand(const std::optional<std::uint32_t>& uarfcn) {
+  if (!uarfcn) return std::nullopt;
+  const std::optional<radio::UmtsChannel> channel = radio::decodeUarfcn(*uarfcn);
+  return channel ? std::optional(channel->band) : std::nullopt;
+}
+
+// The UMTS bands that the records' band enumeration names, by band number.
+constexpr std::array<std::pair<std::uint32_t, SysBand>, 11> kUmtsSysBands = {{
+    {1, SYS_BAND_WCDMA_I_IMT_2000},
+    {2, SYS_BAND_WCDMA_II_PCS_1900},
+    {3, SYS_BAND_WCDMA_III_1700},
+    {4, SYS_BAND_WCDMA_IV_1700},
+    {5, SYS_BAND_WCDMA_V_850},
+    {6, SYS_BAND_WCDMA_VI_800},
+    {7, SYS_BAND_WCDMA_VII_2600},
+    {8, SYS_BAND_WCDMA_VIII_900},
+    {9, SYS_BAND_WCDMA_IX_1700},
+    {11, SYS_BAND_WCDMA_XI_1500},
+    {19, SYS_BAND_WCDMA_XIX_850},
+}};
+
+constexpr std::array<std::pair<radio::GsmBand, SysBand>, 9> kGsmSysBands = {{
+    {radio::GsmBand::gsm450, SYS_BAND_GSM_450},
+    {radio::GsmBand::gsm480, SYS_BAND_GSM_480},
+    {radio::GsmBand::gsm750, SYS_BAND_GSM_750},
+    {radio::GsmBand::gsm850, SYS_BAND_GSM_850},
+    {radio::GsmBand::pgsm900, SYS_BAND_GSM_PGSM_900},
+    {radio::GsmBand::egsm900, SYS_BAND_GSM_EGSM_900},
+    {radio::GsmBand::rgsm900, SYS_BAND_GSM_RGSM_900},
+    {radio::GsmBand::dcs1800, SYS_BAND_GSM_DCS_1800},
+    {radio::GsmBand::pcs1900, SYS_BAND_GSM_PCS_1900},
+}};
+
+template <class Key, std::size_t N>
+std::optional<SysBand> sysBand(const std::array<std::pair<Key, SysBand>, N>& table,
+                               const std::optional<Key>& key) {
+  if (!key) return std::nullopt;
+  for (const auto& [band, sys] : table) {
+    if (band == *key) return sys;
+  }
+  return std::nullopt;
+}
+
+std::optional<radio::GsmBand> gsmBand(const std::optional<std::uint32_t>& arfcn) {
+  if (!arfcn) return std::nullopt;
+  // Without the cell's band indicator, ARFCNs 512 to 810 stay without a band.
+  const std::optional<radio::GsmChannel> channel = radio::decodeArfcn(*arfcn);
+  return channel ? std::optional(channel->band) : std::nullopt;
+}
+
+// The PLMN as the three bytes that NAS identities carry.
+std::optional<platform::Bytes> encodedPlmn(const std::optional<Plmn>& plmn) {
+  if (!plmn) return std::nullopt;
+  const std::optional<radio::Plmn> parsed = radio::plmnFromOperatorCode(plmn->digits);
+  if (!parsed) return std::nullopt;
+  const std::optional<radio::PlmnBytes> bytes = radio::encodePlmn(*parsed);
+  if (!bytes) return std::nullopt;
+  return platform::Bytes(bytes->begin(), bytes->end());
+}
+
 // ---- LTE
 
 std::optional<service::Metric> lteServingCellInfo(const Cell* cell, std::uint64_t atMs) {
@@ -146,6 +217,7 @@ std::optional<service::Metric> lteServingCellInfo(const Cell* cell, std::uint64_
   put(record, &KCellularLteScellInfo::setDlFreq, cell->channel);
   put(record, &KCellularLteScellInfo::setCellId, cell->cellId);
   put(record, &KCellularLteScellInfo::setTrackingAreaCode, cell->tac);
+  put(record, &KCellularLteScellInfo::setFreqBandInd, lteBand(cell->channel));
   if (cell->plmn) {
     record.setSelPlmnMcc(cell->plmn->mcc);
     record.setSelPlmnMnc(cell->plmn->mnc);
@@ -199,6 +271,7 @@ std::optional<service::Metric> lteNeighbours(const Snapshot& snapshot, std::uint
     auto neighbour = std::make_shared<EgwErrcNbrEutraMeas>();
     put(*neighbour, &EgwErrcNbrEutraMeas::setNbrEarfcn, cell->channel);
     put(*neighbour, &EgwErrcNbrEutraMeas::setNbrPhysCellId, cell->pci);
+    put(*neighbour, &EgwErrcNbrEutraMeas::setFreqBandInd, lteBand(cell->channel));
     put(*neighbour, &EgwErrcNbrEutraMeas::setNbrRsrp,
         encode(cell->rsrp, &units::rsrpIndex, "neighbour RSRP"));
     put(*neighbour, &EgwErrcNbrEutraMeas::setNbrRsrq,
@@ -233,16 +306,25 @@ std::optional<service::Metric> lteInterRatNeighbours(const Snapshot& snapshot, s
                   record.measNbrUtrasCount() + record.measNbrGeransCount() > 0);
 }
 
-std::optional<service::Metric> emmContext(const Registration& registration, std::uint64_t atMs) {
+std::optional<service::Metric> emmContext(const Registration& registration, const Cell* cell,
+                                          std::uint64_t atMs) {
   const std::optional<RegStatus> status = regStatus(registration.state);
   KCellularEmmContext record;
   record.setTimestamp(atMs);
   put(record, &KCellularEmmContext::setRegStatus, status);
+  // The tracking area of the serving cell.
+  if (cell != nullptr && cell->tac) {
+    auto tai = std::make_shared<KCellularTrackingAreaId>();
+    tai->setEncodedPlmn(encodedPlmn(cell->plmn));
+    tai->setTac(*cell->tac);
+    record.addTaiList(std::move(tai));
+  }
   // ModemManager counts the EPS modes of operation from 1, the record from 0.
   if (registration.epsUeMode) {
     record.setUeOpMode(static_cast<KCellularEmmContext::UeOpMode>(*registration.epsUeMode - 1));
   }
-  return ifFilled(metric::kEmmContext, record, status || registration.epsUeMode);
+  return ifFilled(metric::kEmmContext, record,
+                  status || registration.epsUeMode || record.taiListsCount() > 0);
 }
 
 // ---- UMTS
@@ -259,6 +341,8 @@ std::optional<service::Metric> umtsServingCellInfo(const Cell* cell, std::uint64
   put(record, &KCellularWcdmaCellInfo::setLac, cell->lac);
   put(record, &KCellularWcdmaCellInfo::setCellId, cell->cellId);
   put(record, &KCellularWcdmaCellInfo::setDlUarfcn, cell->channel);
+  put(record, &KCellularWcdmaCellInfo::setWcdmaBand,
+      sysBand(kUmtsSysBands, umtsBand(cell->channel)));
   put(record, &KCellularWcdmaCellInfo::setPsc, cell->psc);
   return ifFilled(metric::kUmtsServingCellInfo, record,
                   cell->plmn || cell->lac || cell->cellId || cell->channel || cell->psc);
@@ -288,6 +372,7 @@ std::optional<service::Metric> umtsNeighbours(const Snapshot& snapshot, std::uin
   for (const Cell* cell : neighbours(snapshot, Rat::Umts)) {
     auto result = std::make_shared<UtraCellMeasResult>();
     put(*result, &UtraCellMeasResult::setUarfcn, cell->channel);
+    put(*result, &UtraCellMeasResult::setBand, umtsBand(cell->channel));
     put(*result, &UtraCellMeasResult::setPsc, cell->psc);
     put(*result, &UtraCellMeasResult::setRscp,
         encode(cell->rscp, &units::rscpIndex, "neighbour RSCP"));
@@ -306,6 +391,7 @@ std::optional<service::Metric> umtsNeighbours(const Snapshot& snapshot, std::uin
     auto result = std::make_shared<LteCellMeasResult>();
     put(*result, &LteCellMeasResult::setEarfcn, cell->channel);
     put(*result, &LteCellMeasResult::setPhyCellId, cell->pci);
+    put(*result, &LteCellMeasResult::setEutraBand, lteBand(cell->channel));
     put(*result, &LteCellMeasResult::setRsrp,
         encode(cell->rsrp, &units::rsrpIndex, "neighbour RSRP"));
     put(*result, &LteCellMeasResult::setRsrq,
@@ -333,6 +419,7 @@ std::optional<service::Metric> gsmServingCellInfo(const Cell* cell, std::uint64_
   put(record, &KCellularGsmScellInfo::setCellId, cell->cellId);
   put(record, &KCellularGsmScellInfo::setArfcn, cell->channel);
   put(record, &KCellularGsmScellInfo::setBsic, cell->bsic);
+  put(record, &KCellularGsmScellInfo::setGsmBand, sysBand(kGsmSysBands, gsmBand(cell->channel)));
   return ifFilled(metric::kGsmServingCellInfo, record,
                   cell->plmn || cell->lac || cell->cellId || cell->channel || cell->bsic);
 }
@@ -405,6 +492,7 @@ std::optional<service::Metric> mmContext(const Registration& registration, const
   put(record, &KCellularMmContext::setRegStatus, status);
   if (cell != nullptr && cell->lac) {
     auto lai = std::make_shared<KCellularLocationAreaId>();
+    lai->setEncodedPlmn(encodedPlmn(cell->plmn));
     lai->setLac(*cell->lac);
     record.setLai(std::move(lai));
   }
@@ -421,6 +509,7 @@ std::optional<service::Metric> gmmContext(const Registration& registration, cons
   put(record, &KCellularGmmContext::setRegStatus, status);
   if (cell != nullptr && cell->lac) {
     auto rai = std::make_shared<RoutingAreaId>();
+    rai->setEncodedPlmn(encodedPlmn(cell->plmn));
     rai->setLac(*cell->lac);
     record.setRai(std::move(rai));
   }
@@ -454,7 +543,7 @@ std::vector<service::Metric> radioMetrics(const Snapshot& snapshot, std::uint64_
                  lteRsrpRsrqSinr(snapshot.lte, serving, atMs),
                  lteNeighbours(snapshot, atMs, encode),
                  lteInterRatNeighbours(snapshot, atMs, encode),
-                 emmContext(snapshot.registration, atMs)};
+                 emmContext(snapshot.registration, serving, atMs)};
       break;
     case Rat::Umts:
       metrics = {umtsServingCellInfo(serving, atMs),

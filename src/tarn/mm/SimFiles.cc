@@ -4,11 +4,15 @@
 #include <memory>
 
 #include "messages/Records.h"
+#include "radio/Iccid.h"
+#include "radio/Imsi.h"
 #include "tarn/sim/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
 
+constexpr std::uint32_t kEfIccid = 0x2FE2;
+constexpr std::uint32_t kEfImsi = 0x6F07;
 constexpr std::uint32_t kEfSpn = 0x6F46;
 constexpr std::size_t kSpnNameBytes = 16;
 
@@ -39,9 +43,21 @@ std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs
     file->setContent(std::move(content));
     record.addEfList(std::move(file));
   };
+  if (sim.iccid) add(kEfIccid, radio::encodeEfIccid(*sim.iccid));
+  if (sim.imsi) add(kEfImsi, radio::encodeEfImsi(*sim.imsi));
   if (sim.serviceProvider) add(kEfSpn, encodeEfSpn(*sim.serviceProvider));
   if (record.efListsCount() == 0) return std::nullopt;
   return service::Metric{sim::metric_id::kSimFiles, record.data()};
+}
+
+std::optional<service::Metric> mmCommonInfoMetric(const Sim& sim, std::uint64_t atMs) {
+  if (!sim.imsi) return std::nullopt;
+  std::optional<platform::Bytes> imsi = radio::encodeEfImsi(*sim.imsi);
+  if (!imsi) return std::nullopt;
+  messages::KCellularMmCommonInfo record;
+  record.setTimestamp(atMs);
+  record.setImsi(std::move(imsi));
+  return service::Metric{sim::metric_id::kMmCommonInfo, record.data()};
 }
 
 }  // namespace tarn::mm

@@ -11,7 +11,8 @@
 namespace tarn::mm {
 
 // The SIM's elementary files that ModemManager's Sim object tells of, with their contents as a
-// phone reads them off the card; empty when it tells of none.
+// phone reads them off the card: EF_ICCID and EF_IMSI in swapped-nibble BCD padded with F, and
+// EF_SPN. Empty when it tells of none, or of none that encodes.
 std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs);
 
 // EF_SPN (TS 31.102 4.2.12): the display condition byte, which ModemManager does not report and
@@ -19,5 +20,8 @@ std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs
 // a name longer than 16 characters or with a character outside the part of that alphabet that
 // ASCII shares.
 std::optional<platform::Bytes> encodeEfSpn(std::string_view name);
+
+// The IMSI as the NAS common information carries it, in EF_IMSI's encoding; empty without one.
+std::optional<service::Metric> mmCommonInfoMetric(const Sim& sim, std::uint64_t atMs);
 
 }  // namespace tarn::mm

@@ -230,6 +230,16 @@ TEST_F(ModemManagerIntakeTest, MakesNoRecordOfWhatModemManagerDoesNotReport) {
   take(noServingCell);
   EXPECT_THAT(delivered, ::testing::IsEmpty());
 
+  // Without a serving cell, the operator the modem registered on is all there is to show.
+  Snapshot registeredOnly;
+  registeredOnly.registration.accessTechnologies = MM_MODEM_ACCESS_TECHNOLOGY_UMTS;
+  registeredOnly.registration.operatorPlmn = tarn::mm::parsePlmn("310410");
+  take(registeredOnly);
+  ASSERT_TRUE(validator.myUMTSCellInfoDict());
+  EXPECT_EQ(numberIn(validator.myUMTSCellInfoDict(), "mcc"), 310);
+  EXPECT_EQ(numberIn(validator.myUMTSCellInfoDict(), "mnc"), 410);
+  EXPECT_EQ(validator.myUMTSCellInfoDict()->find("psc"), nullptr);
+
   // A value that a baseband's index cannot carry is dropped, not clamped.
   Snapshot tooStrong;
   Cell neighbour = cell(Rat::Lte, false);

@@ -204,6 +204,22 @@ TEST_F(ModemManagerSourceTest, WaitsForModemManagerAndFollowsItThroughARestart) 
   EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
 }
 
+TEST_F(ModemManagerSourceTest, ReportsTheInitialEpsBearerAmongTheActiveBearers) {
+  FakeModemManager::Modem modem = lteModem(kImei);
+  modem.modem3gpp["InitialEpsBearer"] =
+      property(sdbus::ObjectPath(FakeModemManager::bearerPath(7)));
+  fake->addBearer(7,
+                  {{"Connected", property(true)},
+                   {"Properties", property(Entries{{"apn", sdbus::Variant(std::string("ims"))}})}});
+  fake->addModem(0, std::move(modem));
+  startSource();
+  ASSERT_TRUE(eventually([&] {
+    const auto bearers = seen.last<messages::KCellularActivatedBearerContexts>(ids::kActiveBearers);
+    return bearers && bearers->bearerContextsCount() == 1 &&
+           bearers->bearerContextsAtIndex(0)->apn() == "ims";
+  }));
+}
+
 TEST_F(ModemManagerSourceTest, SaysWhenTheModemIsLockedOrDisabled) {
   FakeModemManager::Modem locked = lteModem(kImei);
   locked.modem["State"] = property(std::int32_t{MM_MODEM_STATE_LOCKED});

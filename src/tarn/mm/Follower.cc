@@ -20,6 +20,8 @@ constexpr std::chrono::seconds kCallTimeout{20};
 constexpr std::size_t kMaxProblemLines = 100;
 
 const Dict kNoProperties;
+// The path ModemManager gives for "no object".
+constexpr std::string_view kNoObject = "/";
 
 std::string describeError(const sdbus::Error& error) {
   return error.getName() + ": " + error.getMessage();
@@ -193,12 +195,11 @@ void Follower::propertiesChanged(sdbus::Message& signal) {
     if (interface == kSimInterface) readOwnObjects();  // the SIM's identities changed
     return;
   }
-  if (interface == kModemInterface) {
-    if (changed.contains(std::string(property::kBearers)) ||
-        changed.contains(std::string(property::kSim)))
-      readOwnObjects();
-    if (changed.contains(std::string(property::kState))) sayState();
-  }
+  if (changed.contains(std::string(property::kBearers)) ||
+      changed.contains(std::string(property::kSim)) ||
+      changed.contains(std::string(property::kInitialEpsBearer)))
+    readOwnObjects();
+  if (interface == kModemInterface && changed.contains(std::string(property::kState))) sayState();
 }
 
 void Follower::follow() {
@@ -248,14 +249,26 @@ void Follower::setUpSignal() {
       kCallTimeout);
 }
 
+std::vector<std::string> Follower::bearerPaths(Problems& problems) const {
+  std::vector<std::string> paths = Reader(properties(*modem_, kModemInterface), "Modem", problems)
+                                       .paths(property::kBearers)
+                                       .value_or(std::vector<std::string>{});
+  const std::optional<std::string> initial =
+      Reader(properties(*modem_, kModem3gppInterface), "Modem3gpp", problems)
+          .path(property::kInitialEpsBearer);
+  if (initial && *initial != kNoObject &&
+      std::find(paths.begin(), paths.end(), *initial) == paths.end())
+    paths.push_back(*initial);
+  return paths;
+}
+
 void Follower::readOwnObjects() {
   if (!modem_) return;
   Problems problems;
   const Reader modem(properties(*modem_, kModemInterface), "Modem", problems);
-  if (const std::optional<std::string> sim = modem.path(property::kSim); sim && *sim != "/")
+  if (const std::optional<std::string> sim = modem.path(property::kSim); sim && *sim != kNoObject)
     readProperties(*sim, kSimInterface);
-  for (const std::string& bearer :
-       modem.paths(property::kBearers).value_or(std::vector<std::string>{}))
+  for (const std::string& bearer : bearerPaths(problems))
     readProperties(bearer, kBearerInterface);
   report(problems);
 }
@@ -343,9 +356,7 @@ void Follower::publish() {
   std::vector<service::Metric> metrics = radioMetrics(snapshot, now, problems);
 
   std::vector<Bearer> connected;
-  for (const std::string& path : Reader(modem, "Modem", problems)
-                                     .paths(property::kBearers)
-                                     .value_or(std::vector<std::string>{})) {
+  for (const std::string& path : bearerPaths(problems)) {
     if (std::optional<Bearer> bearer =
             readBearer(properties(path, kBearerInterface), "Bearer " + path, problems))
       connected.push_back(std::move(*bearer));

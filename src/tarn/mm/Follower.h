@@ -55,6 +55,8 @@ class Follower {
   void propertiesChanged(sdbus::Message& signal);
   void follow();
   void setUpSignal();
+  // The modem's bearers and its initial EPS bearer.
+  std::vector<std::string> bearerPaths(Problems& problems) const;
   void readOwnObjects();
   void readProperties(const std::string& path, std::string_view interface);
   void poll();

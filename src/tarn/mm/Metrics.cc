@@ -209,22 +209,21 @@ std::optional<platform::Bytes> encodedPlmn(const std::optional<Plmn>& plmn) {
 
 // ---- LTE
 
-std::optional<service::Metric> lteServingCellInfo(const Cell* cell, std::uint64_t atMs) {
-  if (cell == nullptr) return std::nullopt;
+std::optional<service::Metric> lteServingCellInfo(const Cell& cell, std::uint64_t atMs) {
   KCellularLteScellInfo record;
   record.setTimestamp(atMs);
-  put(record, &KCellularLteScellInfo::setPhyCellId, cell->pci);
-  put(record, &KCellularLteScellInfo::setDlFreq, cell->channel);
-  put(record, &KCellularLteScellInfo::setCellId, cell->cellId);
-  put(record, &KCellularLteScellInfo::setTrackingAreaCode, cell->tac);
-  put(record, &KCellularLteScellInfo::setFreqBandInd, lteBand(cell->channel));
-  if (cell->plmn) {
-    record.setSelPlmnMcc(cell->plmn->mcc);
-    record.setSelPlmnMnc(cell->plmn->mnc);
-    record.setNumMncDigits(cell->plmn->mncDigits);
+  put(record, &KCellularLteScellInfo::setPhyCellId, cell.pci);
+  put(record, &KCellularLteScellInfo::setDlFreq, cell.channel);
+  put(record, &KCellularLteScellInfo::setCellId, cell.cellId);
+  put(record, &KCellularLteScellInfo::setTrackingAreaCode, cell.tac);
+  put(record, &KCellularLteScellInfo::setFreqBandInd, lteBand(cell.channel));
+  if (cell.plmn) {
+    record.setSelPlmnMcc(cell.plmn->mcc);
+    record.setSelPlmnMnc(cell.plmn->mnc);
+    record.setNumMncDigits(cell.plmn->mncDigits);
   }
   return ifFilled(metric::kLteServingCellInfo, record,
-                  cell->pci || cell->channel || cell->cellId || cell->tac || cell->plmn);
+                  cell.pci || cell.channel || cell.cellId || cell.tac || cell.plmn);
 }
 
 std::optional<service::Metric> lteServingMeasurement(const LteSignal& signal, const Cell* cell,
@@ -329,23 +328,22 @@ std::optional<service::Metric> emmContext(const Registration& registration, cons
 
 // ---- UMTS
 
-std::optional<service::Metric> umtsServingCellInfo(const Cell* cell, std::uint64_t atMs) {
-  if (cell == nullptr) return std::nullopt;
+std::optional<service::Metric> umtsServingCellInfo(const Cell& cell, std::uint64_t atMs) {
   KCellularWcdmaCellInfo record;
   record.setTimestamp(atMs);
-  if (cell->plmn) {
-    record.setMcc(cell->plmn->mcc);
-    record.setMnc(cell->plmn->mnc);
-    record.setNumMncDigits(cell->plmn->mncDigits);
+  if (cell.plmn) {
+    record.setMcc(cell.plmn->mcc);
+    record.setMnc(cell.plmn->mnc);
+    record.setNumMncDigits(cell.plmn->mncDigits);
   }
-  put(record, &KCellularWcdmaCellInfo::setLac, cell->lac);
-  put(record, &KCellularWcdmaCellInfo::setCellId, cell->cellId);
-  put(record, &KCellularWcdmaCellInfo::setDlUarfcn, cell->channel);
+  put(record, &KCellularWcdmaCellInfo::setLac, cell.lac);
+  put(record, &KCellularWcdmaCellInfo::setCellId, cell.cellId);
+  put(record, &KCellularWcdmaCellInfo::setDlUarfcn, cell.channel);
   put(record, &KCellularWcdmaCellInfo::setWcdmaBand,
-      sysBand(kUmtsSysBands, umtsBand(cell->channel)));
-  put(record, &KCellularWcdmaCellInfo::setPsc, cell->psc);
+      sysBand(kUmtsSysBands, umtsBand(cell.channel)));
+  put(record, &KCellularWcdmaCellInfo::setPsc, cell.psc);
   return ifFilled(metric::kUmtsServingCellInfo, record,
-                  cell->plmn || cell->lac || cell->cellId || cell->channel || cell->psc);
+                  cell.plmn || cell.lac || cell.cellId || cell.channel || cell.psc);
 }
 
 std::optional<service::Metric> umtsServingMeasurement(const UmtsSignal& signal, const Cell* cell,
@@ -406,22 +404,21 @@ std::optional<service::Metric> umtsNeighbours(const Snapshot& snapshot, std::uin
 
 // ---- GSM
 
-std::optional<service::Metric> gsmServingCellInfo(const Cell* cell, std::uint64_t atMs) {
-  if (cell == nullptr) return std::nullopt;
+std::optional<service::Metric> gsmServingCellInfo(const Cell& cell, std::uint64_t atMs) {
   KCellularGsmScellInfo record;
   record.setTimestamp(atMs);
-  if (cell->plmn) {
-    record.setMcc(cell->plmn->mcc);
-    record.setMnc(cell->plmn->mnc);
-    record.setNumMncDigits(cell->plmn->mncDigits);
+  if (cell.plmn) {
+    record.setMcc(cell.plmn->mcc);
+    record.setMnc(cell.plmn->mnc);
+    record.setNumMncDigits(cell.plmn->mncDigits);
   }
-  put(record, &KCellularGsmScellInfo::setLac, cell->lac);
-  put(record, &KCellularGsmScellInfo::setCellId, cell->cellId);
-  put(record, &KCellularGsmScellInfo::setArfcn, cell->channel);
-  put(record, &KCellularGsmScellInfo::setBsic, cell->bsic);
-  put(record, &KCellularGsmScellInfo::setGsmBand, sysBand(kGsmSysBands, gsmBand(cell->channel)));
+  put(record, &KCellularGsmScellInfo::setLac, cell.lac);
+  put(record, &KCellularGsmScellInfo::setCellId, cell.cellId);
+  put(record, &KCellularGsmScellInfo::setArfcn, cell.channel);
+  put(record, &KCellularGsmScellInfo::setBsic, cell.bsic);
+  put(record, &KCellularGsmScellInfo::setGsmBand, sysBand(kGsmSysBands, gsmBand(cell.channel)));
   return ifFilled(metric::kGsmServingCellInfo, record,
-                  cell->plmn || cell->lac || cell->cellId || cell->channel || cell->bsic);
+                  cell.plmn || cell.lac || cell.cellId || cell.channel || cell.bsic);
 }
 
 std::optional<service::Metric> gsmServingMeasurement(const GsmSignal& signal, const Cell* cell,
@@ -534,11 +531,22 @@ std::vector<service::Metric> radioMetrics(const Snapshot& snapshot, std::uint64_
   const std::optional<Rat> rat = currentRat(snapshot);
   if (!rat) return {};
   const Encoder encode(problems);
-  const Cell* serving = servingCell(snapshot, *rat);
+  // The serving cell as GetCellInfo gives it, its PLMN else the one the modem registered on.
+  std::optional<Cell> known;
+  if (const Cell* cell = servingCell(snapshot, *rat)) known = *cell;
+  if (snapshot.registration.operatorPlmn && !(known && known->plmn)) {
+    if (!known) {
+      known.emplace();
+      known->rat = *rat;
+      known->serving = true;
+    }
+    known->plmn = snapshot.registration.operatorPlmn;
+  }
+  const Cell* serving = known ? &*known : nullptr;
   std::vector<std::optional<service::Metric>> metrics;
   switch (*rat) {
     case Rat::Lte:
-      metrics = {lteServingCellInfo(serving, atMs),
+      metrics = {serving ? lteServingCellInfo(*serving, atMs) : std::nullopt,
                  lteServingMeasurement(snapshot.lte, serving, atMs, encode),
                  lteRsrpRsrqSinr(snapshot.lte, serving, atMs),
                  lteNeighbours(snapshot, atMs, encode),
@@ -546,17 +554,18 @@ std::vector<service::Metric> radioMetrics(const Snapshot& snapshot, std::uint64_
                  emmContext(snapshot.registration, serving, atMs)};
       break;
     case Rat::Umts:
-      metrics = {umtsServingCellInfo(serving, atMs),
+      metrics = {serving ? umtsServingCellInfo(*serving, atMs) : std::nullopt,
                  umtsServingMeasurement(snapshot.umts, serving, atMs, encode),
                  umtsNeighbours(snapshot, atMs, encode),
                  mmContext(snapshot.registration, serving, atMs),
                  gmmContext(snapshot.registration, serving, atMs)};
       break;
     case Rat::Gsm:
-      metrics = {
-          gsmServingCellInfo(serving, atMs), gsmServingMeasurement(snapshot.gsm, serving, atMs),
-          gsmNeighbours(snapshot, atMs, encode), mmContext(snapshot.registration, serving, atMs),
-          gmmContext(snapshot.registration, serving, atMs)};
+      metrics = {serving ? gsmServingCellInfo(*serving, atMs) : std::nullopt,
+                 gsmServingMeasurement(snapshot.gsm, serving, atMs),
+                 gsmNeighbours(snapshot, atMs, encode),
+                 mmContext(snapshot.registration, serving, atMs),
+                 gmmContext(snapshot.registration, serving, atMs)};
       break;
   }
   std::vector<service::Metric> made;

@@ -44,6 +44,7 @@ inline constexpr std::string_view kModel = "Model";
 // Modem3gpp
 inline constexpr std::string_view kImei = "Imei";
 inline constexpr std::string_view kRegistrationState = "RegistrationState";
+inline constexpr std::string_view kOperatorCode = "OperatorCode";
 inline constexpr std::string_view kEpsUeModeOperation = "EpsUeModeOperation";
 inline constexpr std::string_view kPacketServiceState = "PacketServiceState";
 inline constexpr std::string_view kInitialEpsBearer = "InitialEpsBearer";
@@ -123,6 +124,7 @@ inline constexpr Member kMembersUsed[] = {
     {kModemInterface, Member::Kind::Property, property::kModel, "s"},
     {kModem3gppInterface, Member::Kind::Property, property::kImei, "s"},
     {kModem3gppInterface, Member::Kind::Property, property::kRegistrationState, "u"},
+    {kModem3gppInterface, Member::Kind::Property, property::kOperatorCode, "s"},
     {kModem3gppInterface, Member::Kind::Property, property::kEpsUeModeOperation, "u"},
     {kModem3gppInterface, Member::Kind::Property, property::kPacketServiceState, "u"},
     {kModem3gppInterface, Member::Kind::Property, property::kInitialEpsBearer, "o"},

@@ -160,6 +160,7 @@ Registration readRegistration(const Dict& modem, const Dict& modem3gpp, Problems
                                         MM_MODEM_3GPP_EPS_UE_MODE_OPERATION_CSPS_2),
       .packetService = from3gpp.unsignedInt(property::kPacketServiceState,
                                             MM_MODEM_3GPP_PACKET_SERVICE_STATE_ATTACHED),
+      .operatorPlmn = plmn(from3gpp, property::kOperatorCode),
   };
   // ModemManager documents these zeros as "unknown".
   if (registration.state == MM_MODEM_3GPP_REGISTRATION_STATE_UNKNOWN) registration.state.reset();

@@ -57,6 +57,7 @@ struct Registration {
   std::optional<std::uint32_t> state;               // MMModem3gppRegistrationState
   std::optional<std::uint32_t> epsUeMode;           // MMModem3gppEpsUeModeOperation
   std::optional<std::uint32_t> packetService;       // MMModem3gppPacketServiceState
+  std::optional<Plmn> operatorPlmn;                 // the PLMN registered on
 };
 
 // One connected bearer.

@@ -2,6 +2,7 @@
 // its own and a client's store, and through the service built into norvo.
 #include "Drive.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <stdlib.h>
 
@@ -15,6 +16,7 @@
 #include "app/ServiceOption.h"
 #include "client/TarnWrapper.h"
 #include "platform/MainQueue.h"
+#include "screens/SecondLevelViewController.h"
 #include "store/MetricValidator.h"
 #include "tarn/client/Transport.h"
 #include "tarn/dbus/BusTransport.h"
@@ -57,6 +59,8 @@ class StoreSession {
     session_.listen();
   }
 
+  MetricValidator& store() { return *store_; }
+
   // Runs the main queue until `shown` holds for the store.
   bool shows(const std::function<bool(const MetricValidator&)>& shown) {
     return platform::runMainQueueUntil([&] { return shown(*store_); }, kStepTimeout);
@@ -66,6 +70,26 @@ class StoreSession {
   std::shared_ptr<MetricValidator> store_ = std::make_shared<MetricValidator>(nullptr);
   TarnWrapper session_;
 };
+
+// The rows, name and value, that the detail screen of `launch` and `item` shows.
+std::vector<std::pair<std::string, std::string>> screenRows(MetricValidator& store,
+                                                            std::string launch, std::string item) {
+  SecondLevelViewController screen(store);
+  screen.tableView().registerPrototype(
+      ui::TableViewCell("SecondClickView", ui::CellStyle::RightDetail));
+  screen.setFirstSelection(std::move(launch));
+  screen.setSeguedThroughRow(std::move(item));
+  screen.tableView().reloadData();
+  std::vector<std::pair<std::string, std::string>> rows;
+  for (const auto& section : screen.tableView().sections()) {
+    for (const auto& cell : section.cells)
+      rows.emplace_back(cell->textLabel()->text.value_or(""),
+                        cell->detailTextLabel()->text.value_or(""));
+  }
+  return rows;
+}
+
+using Row = std::pair<std::string, std::string>;
 
 const auto lteShownWithPci = [](double pci) {
   return [pci](const MetricValidator& store) {
@@ -86,6 +110,14 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
            firstRow(store.myLTE().RsrpRsrqSinr, "rsrp0") == -97 &&
            firstRow(store.myLTE().RsrpRsrqSinr, "sinr0") == 12.5;
   }));
+
+  // The screens show it as they show a phone's.
+  EXPECT_THAT(screenRows(session.store(), "LTE", "Serving Cell Info"),
+              ::testing::IsSupersetOf({Row{"phy_cell_id", "416"}, Row{"dl_freq", "1300"},
+                                       Row{"freq_band_ind", "3"}, Row{"sel_plmn_mcc", "210"}}));
+  EXPECT_THAT(screenRows(session.store(), "LTE", "LTE Neighbor Cell Meas"),
+              ::testing::IsSupersetOf({Row{"nbr_phys_cell_id", "17"}, Row{"nbr_rsrp", "-105"},
+                                       Row{"nbr_rsrq", "-14.5"}}));
 
   // A handover to PCI 17.
   fake.setCells(0, {lteCell(true, 17, 1300, -92, -10), lteCell(false, 0x1A0, 1300, -104, -13)});
@@ -118,6 +150,9 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
            numberIn(store.myGSMIdleScellMeasDict(), "idle_rxlev_dBm") == -77 &&
            firstRow(store.myGSM().utraNbrMeas, "cpich_rscp") == -101;
   }));
+
+  EXPECT_THAT(screenRows(session.store(), "GSM", "Serving Cell Info"),
+              ::testing::IsSupersetOf({Row{"arfcn", "62"}, Row{"bsic", "42"}}));
 
   // A bearer comes up...
   fake.addBearer(

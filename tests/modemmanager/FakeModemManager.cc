@@ -17,7 +17,7 @@ const std::map<std::string, std::map<std::string, Property>, std::less<>>& neutr
   static const auto* table =
       new std::map<std::string, std::map<std::string, Property>, std::less<>>{
           {std::string(mm::kModemInterface),
-           {{"State", property(std::int32_t{8})},
+           {{"State", property(std::int32_t{MM_MODEM_STATE_REGISTERED})},
             {"AccessTechnologies", property(std::uint32_t{0})},
             {"EquipmentIdentifier", property(std::string())},
             {"Model", property(std::string())},

@@ -133,8 +133,9 @@ void Follower::ownerChanged(sdbus::Message& signal) {
     return;  // not what the bus sends
   }
   objects_.clear();
-  proxies_.clear();
+  proxies_.clear();  // and with them the calls they wait on
   cells_.clear();
+  cellsPending_ = false;
   present_ = false;
   if (newOwner.empty()) {
     say("ModemManager has left the bus; waiting for it to return");
@@ -309,12 +310,16 @@ void Follower::poll() {
     publish();
     return;
   }
+  // A modem slower than the refresh is asked again once it has answered.
+  if (cellsPending_) return;
+  cellsPending_ = true;
   sdbus::IProxy& modem = proxy(*modem_);
   sdbus::MethodCall call =
       modem.createMethodCall(std::string(kModemInterface), std::string(method::kGetCellInfo));
   modem.callMethod(
       call,
       [this, path = *modem_](sdbus::MethodReply& reply, const sdbus::Error* error) {
+        cellsPending_ = false;
         if (path != modem_) return;  // answered for a modem no longer followed
         cells_.clear();
         if (error != nullptr) {

@@ -80,6 +80,7 @@ class Follower {
   std::optional<std::string> modem_;
   std::vector<Dict> cells_;
   bool cellsRefused_ = false;
+  bool cellsPending_ = false;  // a GetCellInfo has not been answered yet
   bool hadBearers_ = false;
   std::string lastState_;
   std::string lastWaiting_;

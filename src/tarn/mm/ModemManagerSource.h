@@ -31,8 +31,6 @@ using StatusSink = std::function<void(const std::string& line)>;
 // Milliseconds since 1970, the metrics' timestamps.
 using WallClock = std::function<std::uint64_t()>;
 
-class Follower;
-
 // The metrics of a real modem, through ModemManager on D-Bus: follows one modem (the first, or
 // the chosen one), refreshes its signal and cells every `refresh`, and delivers them as the
 // records a baseband does (Metrics.h). Waits for ModemManager and for the modem when they are
@@ -44,7 +42,8 @@ class ModemManagerSource final : public service::MetricSource {
   ModemManagerSource(const ModemManagerSource&) = delete;
   ModemManagerSource& operator=(const ModemManagerSource&) = delete;
 
-  // `deliver` runs on the source's D-Bus thread. Does nothing while running.
+  // `deliver` runs on the thread of the source's D-Bus connection (a new one after the bus
+  // comes back), one call at a time. Does nothing while running.
   void start(std::function<void(service::Metric)> deliver) override;
   // Must not be called from `deliver`.
   void stop() override;

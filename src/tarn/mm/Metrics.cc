@@ -13,31 +13,12 @@
 #include "radio/Plmn.h"
 #include "radio/UmtsBands.h"
 #include "tarn/mm/BasebandUnits.h"
-#include "tarn/sim/MetricIds.h"
+#include "tarn/mm/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
 
 using namespace messages;
-
-// The metrics this source fills: the one place that names their IDs.
-namespace metric {
-constexpr std::uint32_t kLteServingCellInfo = sim::metric_id::kLteServingCellInfo;
-constexpr std::uint32_t kLteServingCellMeas = sim::metric_id::kLteServingCellMeas;
-constexpr std::uint32_t kLteRsrpRsrqSinr = sim::metric_id::kLteRsrpRsrqSinr;
-constexpr std::uint32_t kLteNeighbourMeas = sim::metric_id::kLteNeighbourMeas;
-constexpr std::uint32_t kLteInterRatMeas = sim::metric_id::kLteInterRatMeas;
-constexpr std::uint32_t kUmtsServingCellInfo = sim::metric_id::kUmtsServingCellInfo;
-constexpr std::uint32_t kUmtsServingCellMeas = sim::metric_id::kUmtsServingCellMeas;
-constexpr std::uint32_t kUmtsNeighbourMeas = sim::metric_id::kUmtsNeighbourMeas;
-constexpr std::uint32_t kGsmServingCellInfo = sim::metric_id::kGsmServingCellInfo;
-constexpr std::uint32_t kGsmIdleServingMeas = sim::metric_id::kGsmIdleServingMeas;
-constexpr std::uint32_t kGsmNeighbourMeas = sim::metric_id::kGsmNeighbourMeas;
-constexpr std::uint32_t kMmContext = sim::metric_id::kMmContext;
-constexpr std::uint32_t kGmmContext = sim::metric_id::kGmmContext;
-constexpr std::uint32_t kEmmContext = sim::metric_id::kEmmContext;
-constexpr std::uint32_t kActiveBearers = sim::metric_id::kActiveBearers;
-}  // namespace metric
 
 using RegStatus = KCellularEmmContext::RegStatus;
 

@@ -7,7 +7,7 @@ packages=(
   build-essential cmake ninja-build pkg-config clang-format lld
   protobuf-compiler libprotobuf-dev libprotoc-dev
   libboost1.81-dev libboost-json1.81-dev
-  libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev
+  libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev modemmanager-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   chromium nodejs
 )

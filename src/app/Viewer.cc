@@ -14,6 +14,8 @@
 #include "platform/ParseNumber.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
+#include "tarn/mm/ModemManagerSource.h"
+#include "tarn/mm/SourceOption.h"
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Application.h"
@@ -24,6 +26,7 @@ namespace app {
 const std::string_view kViewerUsage =
     "usage: norvo [--listen ADDR:PORT] [--service WHERE]\n"
     "             [--replay LOG.jsonl [--speed X] [--loop]]\n"
+    "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
     "neighbour cells, carrier aggregation, NAS state, bearers and SIM files. The metrics come\n"
@@ -42,6 +45,11 @@ const std::string_view kViewerUsage =
     "  --speed X           replay X times as fast as recorded (default 1), or \"max\" for\n"
     "                      no pauses at all\n"
     "  --loop              start the log over after its last metric\n"
+    "  --source modemmanager[:MODEM]\n"
+    "                      show a real modem through ModemManager on the system bus: the\n"
+    "                      first modem, or the one of this D-Bus path, index or IMEI\n"
+    "                      (docs/modemmanager.md)\n"
+    "  --refresh SECONDS   how often to read the modem's signal and cells, 1 to 5 (default 2)\n"
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
@@ -55,6 +63,7 @@ struct ViewerOptions {
   ServiceChoice service;
   std::optional<std::string> replayPath;
   tarn::replay::ReplayOptions replay;
+  std::optional<tarn::mm::ModemManagerOptions> modem;
 };
 
 std::nullopt_t refuse(std::string_view why) {
@@ -64,7 +73,7 @@ std::nullopt_t refuse(std::string_view why) {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> listen, service, replay, speed;
+  std::optional<std::string_view> listen, service, replay, speed, source, refresh;
   bool loop = false;
   const platform::CommandLineOption table[] = {
       {"--listen", &listen, "an address and a port"},
@@ -72,6 +81,8 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       {"--replay", &replay, "a metric log"},
       {"--speed", &speed},
       {"--loop", &loop},
+      {"--source", &source},
+      {"--refresh", &refresh},
   };
   if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
     std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
@@ -103,11 +114,33 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
   }
   if ((speed || loop) && !replay) return refuse("--speed and --loop go with --replay");
   if (replay) options.replayPath = std::string(*replay);
+  if (source && *source != "sim") {
+    const std::optional<std::string> modem = tarn::mm::parseModemManagerSource(*source);
+    if (!modem) return refuse("--source wants sim or modemmanager[:MODEM]");
+    if (replay || options.service.bus) {
+      return refuse(
+          "--source modemmanager goes with the built-in service and without --replay; on D-Bus, "
+          "run\n"
+          "       tarnd --source modemmanager");
+    }
+    options.modem = tarn::mm::ModemManagerOptions{.modem = *modem};
+  }
+  if (refresh) {
+    if (!options.modem) return refuse("--refresh goes with --source modemmanager");
+    const std::optional<std::chrono::seconds> seconds = tarn::mm::parseRefresh(*refresh);
+    if (!seconds) return refuse(tarn::mm::kRefreshWanted);
+    options.modem->refresh = *seconds;
+  }
   return options;
 }
 
-// The metrics of the service inside Norvo: a replayed log, or the simulated phone.
+// The metrics of the service inside Norvo: a modem, a replayed log, or the simulated phone.
 std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& options) {
+  if (options.modem) {
+    return std::make_shared<tarn::mm::ModemManagerSource>(
+        *options.modem,
+        [](const std::string& line) { std::cerr << "norvo: modemmanager: " << line << std::endl; });
+  }
   if (options.replayPath) {
     return std::make_shared<tarn::replay::ReplaySource>(*options.replayPath, options.replay,
                                                         std::cerr);

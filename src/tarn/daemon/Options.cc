@@ -14,6 +14,7 @@ struct GivenOptions {
   std::optional<std::string_view> speed;
   std::optional<std::string_view> bus;
   std::optional<std::string_view> record;
+  std::optional<std::string_view> refresh;
   bool asFastAsPossible = false;
   bool loop = false;
 };
@@ -41,7 +42,7 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
       {"--source", &given.source}, {"--seed", &given.seed},
       {"--speed", &given.speed},   {"--bus", &given.bus},
       {"--record", &given.record}, {"--as-fast-as-possible", &given.asFastAsPossible},
-      {"--loop", &given.loop},
+      {"--loop", &given.loop},     {"--refresh", &given.refresh},
   };
   if (std::string error = platform::readCommandLine(arguments, table); !error.empty())
     return refuse(std::move(error));
@@ -54,7 +55,19 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
     if (!speed) return refuse("--speed wants a number above 0");
   }
   const std::string_view source = given.source.value_or("sim");
-  if (source == "sim") {
+  const std::optional<std::string> modem = mm::parseModemManagerSource(source);
+  if (given.refresh && !modem) return refuse("--refresh goes with --source modemmanager");
+  if (modem) {
+    if (given.seed || speed || asFastAsPossible || given.loop)
+      return refuse("--seed, --speed, --as-fast-as-possible and --loop do not go with a modem");
+    ModemManagerChoice choice{.modem = *modem};
+    if (given.refresh) {
+      const std::optional<std::chrono::seconds> refresh = mm::parseRefresh(*given.refresh);
+      if (!refresh) return refuse(std::string(mm::kRefreshWanted));
+      choice.refresh = *refresh;
+    }
+    options.source = std::move(choice);
+  } else if (source == "sim") {
     if (asFastAsPossible || given.loop)
       return refuse("--as-fast-as-possible and --loop go with --source replay:FILE");
     SimulatorChoice simulator;
@@ -77,7 +90,8 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
       replay.options.speed = speed;
     options.source = std::move(replay);
   } else {
-    return refuse("--source wants sim or replay:FILE.jsonl, not " + std::string(source));
+    return refuse("--source wants sim, replay:FILE.jsonl or modemmanager[:MODEM], not " +
+                  std::string(source));
   }
 
   if (given.bus) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <optional>
 #include <span>
@@ -7,6 +8,7 @@
 #include <string_view>
 #include <variant>
 
+#include "tarn/mm/SourceOption.h"
 #include "tarn/replay/ReplaySource.h"
 
 namespace tarn::daemon {
@@ -21,8 +23,14 @@ struct ReplayChoice {
   replay::ReplayOptions options;
 };
 
+// A real modem through ModemManager on the system bus.
+struct ModemManagerChoice {
+  std::string modem;  // empty for the first
+  std::chrono::seconds refresh = mm::kDefaultRefresh;
+};
+
 struct DaemonOptions {
-  std::variant<SimulatorChoice, ReplayChoice> source;
+  std::variant<SimulatorChoice, ReplayChoice, ModemManagerChoice> source;
   // "session", "system" or a D-Bus address.
   std::string bus = "session";
   std::optional<std::string> recordPath;

@@ -51,12 +51,44 @@ TEST(DaemonOptions, ReadsAReplayWithItsPaceAndLoop) {
   EXPECT_EQ(parse(cases[0].arguments).options->bus, "unix:path=/run/user/1000/bus");
 }
 
+TEST(DaemonOptions, ReadsAModemManagerSourceWithItsModemAndRefresh) {
+  const struct {
+    std::vector<std::string_view> arguments;
+    std::string_view modem;
+    std::chrono::seconds refresh;
+  } cases[] = {
+      {{"--source", "modemmanager"}, "", std::chrono::seconds(2)},
+      {{"--source", "modemmanager:3", "--refresh", "1"}, "3", std::chrono::seconds(1)},
+      {{"--source", "modemmanager:/org/freedesktop/ModemManager1/Modem/0", "--refresh", "5"},
+       "/org/freedesktop/ModemManager1/Modem/0",
+       std::chrono::seconds(5)},
+      {{"--source", "modemmanager:356938035643809", "--bus", "system"},
+       "356938035643809",
+       std::chrono::seconds(2)},
+  };
+  for (const auto& each : cases) {
+    const ParsedOptions parsed = parse(each.arguments);
+    ASSERT_TRUE(parsed.options) << parsed.error;
+    const auto& modem = std::get<ModemManagerChoice>(parsed.options->source);
+    EXPECT_EQ(modem.modem, each.modem);
+    EXPECT_EQ(modem.refresh, each.refresh);
+  }
+}
+
 TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp) {
   const struct {
     std::vector<std::string_view> arguments;
     std::string_view error;
   } cases[] = {
-      {{"--source", "replay:"}, "--source wants sim or replay:FILE.jsonl, not replay:"},
+      {{"--source", "replay:"},
+       "--source wants sim, replay:FILE.jsonl or modemmanager[:MODEM], not replay:"},
+      {{"--source", "modemmanager:"},
+       "--source wants sim, replay:FILE.jsonl or modemmanager[:MODEM], not modemmanager:"},
+      {{"--refresh", "2"}, "--refresh goes with --source modemmanager"},
+      {{"--source", "modemmanager", "--refresh", "6"}, "--refresh wants whole seconds from 1 to 5"},
+      {{"--source", "modemmanager", "--refresh", "0"}, "--refresh wants whole seconds from 1 to 5"},
+      {{"--source", "modemmanager", "--seed", "2"},
+       "--seed, --speed, --as-fast-as-possible and --loop do not go with a modem"},
       {{"--seed", "-1"}, "--seed wants a whole number of at least 0"},
       {{"--seed", "18446744073709551616"}, "--seed wants a whole number of at least 0"},
       {{"--speed", "0"}, "--speed wants a number above 0"},

@@ -19,6 +19,7 @@
 #include "tarn/dbus/Interface.h"
 #include "tarn/dbus/Service.h"
 #include "tarn/log/RecordingSource.h"
+#include "tarn/mm/ModemManagerSource.h"
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/service/Core.h"
 #include "tarn/sim/SimulatorSource.h"
@@ -26,12 +27,14 @@
 namespace {
 
 using tarn::daemon::DaemonOptions;
+using tarn::daemon::ModemManagerChoice;
 using tarn::daemon::ReplayChoice;
 using tarn::daemon::SimulatorChoice;
 
 constexpr std::string_view kUsage =
     "usage: tarnd [--source sim [--seed N] [--speed X]]\n"
     "       tarnd --source replay:LOG.jsonl [--speed X | --as-fast-as-possible] [--loop]\n"
+    "       tarnd --source modemmanager[:MODEM] [--refresh SECONDS]\n"
     "             [--bus session|system|ADDRESS] [--record OUT.jsonl]\n"
     "\n"
     "Serves the baseband manager service on D-Bus under the name org.norvo.Tarn1 until SIGINT\n"
@@ -46,6 +49,12 @@ constexpr std::string_view kUsage =
     "  --speed X                run X times as fast as real time, or as recorded (default 1)\n"
     "  --as-fast-as-possible    replay without pauses (also --speed max)\n"
     "  --loop                   start the log over after its last metric\n"
+    "  --source modemmanager[:MODEM]\n"
+    "                           a real modem through ModemManager on the system bus\n"
+    "                           (DBUS_SYSTEM_BUS_ADDRESS points elsewhere): the first modem, or\n"
+    "                           the one of this D-Bus path, index or IMEI\n"
+    "  --refresh SECONDS        how often to read the modem's signal and cells, 1 to 5\n"
+    "                           (default 2)\n"
     "  --bus BUS                session (the default), system, or a D-Bus address such as\n"
     "                           unix:path=/run/user/1000/bus\n"
     "  --record OUT.jsonl       write every metric the source produces to a metric log, with\n"
@@ -68,6 +77,9 @@ std::string describeSource(const DaemonOptions& options) {
   if (const auto* simulator = std::get_if<SimulatorChoice>(&options.source)) {
     text = platform::format("sim, seed %u", simulator->seed);
     if (simulator->speed != 1.0) text += platform::format(", speed %g", simulator->speed);
+  } else if (const auto* modem = std::get_if<ModemManagerChoice>(&options.source)) {
+    text = "modemmanager, " + (modem->modem.empty() ? "the first modem" : "modem " + modem->modem) +
+           platform::format(", every %u s", modem->refresh.count());
   } else {
     const auto& replay = std::get<ReplayChoice>(options.source);
     text = "replay of " + replay.path;
@@ -85,6 +97,11 @@ std::string describeSource(const DaemonOptions& options) {
 std::shared_ptr<tarn::service::MetricSource> makeSource(const DaemonOptions& options) {
   if (const auto* simulator = std::get_if<SimulatorChoice>(&options.source))
     return std::make_shared<tarn::sim::SimulatorSource>(simulator->seed, simulator->speed);
+  if (const auto* modem = std::get_if<ModemManagerChoice>(&options.source)) {
+    return std::make_shared<tarn::mm::ModemManagerSource>(
+        tarn::mm::ModemManagerOptions{.modem = modem->modem, .refresh = modem->refresh},
+        [](const std::string& line) { std::cerr << "tarnd: modemmanager: " << line << std::endl; });
+  }
   const auto& replay = std::get<ReplayChoice>(options.source);
   return std::make_shared<tarn::replay::ReplaySource>(replay.path, replay.options, std::cerr);
 }

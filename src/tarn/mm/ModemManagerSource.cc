@@ -1,0 +1,94 @@
+#include "tarn/mm/ModemManagerSource.h"
+
+#include <sdbus-c++/Error.h>
+
+#include "tarn/dbus/Bus.h"
+#include "tarn/mm/Follower.h"
+#include "tarn/mm/MetricIds.h"
+
+namespace tarn::mm {
+namespace {
+
+std::uint64_t systemNowMs() {
+  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::milliseconds>(
+                                        std::chrono::system_clock::now().time_since_epoch())
+                                        .count());
+}
+
+}  // namespace
+
+ModemManagerSource::ModemManagerSource(ModemManagerOptions options, StatusSink status,
+                                       WallClock clock)
+    : options_(std::move(options)),
+      status_(std::move(status)),
+      clock_(clock ? std::move(clock) : WallClock(&systemNowMs)) {}
+
+ModemManagerSource::~ModemManagerSource() {
+  stop();
+}
+
+void ModemManagerSource::start(std::function<void(service::Metric)> deliver) {
+  std::lock_guard lock(mutex_);
+  if (worker_.joinable()) return;
+  worker_ = std::jthread(
+      [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
+}
+
+void ModemManagerSource::stop() {
+  std::jthread worker;
+  {
+    std::lock_guard lock(mutex_);
+    worker = std::move(worker_);
+  }
+  // Leaving this scope asks the worker to stop and joins it; the worker ends its follower, whose
+  // thread delivers, before it returns.
+}
+
+std::optional<service::Metric> ModemManagerSource::query(std::uint32_t metricId) {
+  if (metricId != metric::kSimFiles) return std::nullopt;
+  std::lock_guard lock(mutex_);
+  return simFiles_;
+}
+
+// Connects, and reconnects after the bus goes away, then asks the follower for a refresh every
+// `refresh` until stopped.
+void ModemManagerSource::run(std::stop_token stop,
+                             const std::function<void(service::Metric)>& deliver) {
+  std::unique_ptr<Follower> follower;
+  std::string lastFailure;
+  Follower::Hooks hooks{
+      .deliver = deliver,
+      .simFiles =
+          [this, deliver](service::Metric files) {
+            {
+              std::lock_guard lock(mutex_);
+              simFiles_ = files;
+            }
+            deliver(std::move(files));
+          },
+      .status = status_,
+      .clock = clock_,
+  };
+  std::mutex sleeping;
+  std::unique_lock lock(sleeping);
+  do {
+    if (follower && follower->lost()) follower.reset();
+    if (!follower) {
+      try {
+        follower =
+            std::make_unique<Follower>(tarn::dbus::connectToBus(options_.bus), options_, hooks);
+        lastFailure.clear();
+      } catch (const sdbus::Error& error) {
+        const std::string failure =
+            "cannot reach the " + options_.bus + " bus: " + error.getMessage() + "; trying again";
+        if (failure != lastFailure) status_(failure);
+        lastFailure = failure;
+      }
+    } else {
+      follower->refresh();
+    }
+  } while (
+      !wake_.wait_for(lock, stop, options_.refresh, [&stop] { return stop.stop_requested(); }));
+}
+
+}  // namespace tarn::mm

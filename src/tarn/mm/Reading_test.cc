@@ -1,0 +1,144 @@
+#include "tarn/mm/Reading.h"
+
+#include <ModemManager.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace tarn::mm {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+
+Value u(std::uint64_t number) {
+  return {"u", number};
+}
+Value s(std::string text) {
+  return {"s", std::move(text)};
+}
+Value d(double number) {
+  return {"d", number};
+}
+Value b(bool flag) {
+  return {"b", flag};
+}
+
+TEST(ReadingACell, TakesEachTechnologysKeysAndSkipsCellTypesWithoutARecord) {
+  Problems problems;
+  const std::optional<Cell> lte = readCell({{"cell-type", u(MM_CELL_TYPE_LTE)},
+                                            {"serving", b(true)},
+                                            {"operator-id", s("21034")},
+                                            {"tac", s("84CD")},
+                                            {"ci", s("D30156")},
+                                            {"physical-ci", s("1A0")},
+                                            {"earfcn", u(1300)},
+                                            {"rsrp", d(-97)},
+                                            {"rsrq", d(-11.5)},
+                                            {"timing-advance", u(3)}},
+                                           "cell 0", problems);
+  ASSERT_TRUE(lte);
+  EXPECT_EQ(lte->rat, Rat::Lte);
+  EXPECT_TRUE(lte->serving);
+  EXPECT_EQ(lte->plmn->mcc, 210u);
+  EXPECT_EQ(lte->plmn->mnc, 34u);
+  EXPECT_EQ(lte->plmn->mncDigits, 2u);
+  EXPECT_EQ(lte->tac, 0x84CDu);
+  EXPECT_EQ(lte->cellId, 0xD30156u);
+  EXPECT_EQ(lte->pci, 0x1A0u);
+  EXPECT_EQ(lte->channel, 1300u);
+  EXPECT_EQ(lte->rsrp, -97.0);
+  EXPECT_EQ(lte->rsrq, -11.5);
+
+  const std::optional<Cell> gsm = readCell({{"cell-type", u(MM_CELL_TYPE_GSM)},
+                                            {"serving", b(false)},
+                                            {"operator-id", s("310410")},
+                                            {"lac", s("1F")},
+                                            {"arfcn", u(62)},
+                                            {"base-station-id", s("2A")},
+                                            {"rx-level", u(40)}},
+                                           "cell 1", problems);
+  ASSERT_TRUE(gsm);
+  EXPECT_EQ(gsm->plmn->mnc, 410u);
+  EXPECT_EQ(gsm->plmn->mncDigits, 3u);
+  EXPECT_EQ(gsm->bsic, 0x2Au);
+  EXPECT_EQ(gsm->rxLevel, 40u);
+  EXPECT_THAT(problems, IsEmpty());
+
+  EXPECT_FALSE(readCell({{"cell-type", u(MM_CELL_TYPE_5GNR)}, {"serving", b(true)}}, "", problems));
+  EXPECT_FALSE(readCell({{"cell-type", u(MM_CELL_TYPE_LTE)}}, "", problems));
+  EXPECT_FALSE(readCell({{"cell-type", s("LTE")}, {"serving", b(true)}}, "cell 4", problems));
+  EXPECT_THAT(problems, ElementsAre("cell 4 \"cell-type\": wanted u, got s; dropped"));
+}
+
+TEST(ReadingACell, DropsOddValuesButKeepsTheRest) {
+  Problems problems;
+  const std::optional<Cell> cell = readCell({{"cell-type", u(MM_CELL_TYPE_UMTS)},
+                                             {"serving", b(true)},
+                                             {"operator-id", s("2103")},
+                                             {"lac", s("zz")},
+                                             {"uarfcn", s("10700")},
+                                             {"psc", u(600)},
+                                             {"rscp", d(-80)},
+                                             {"ecio", d(5)}},
+                                            "cell 0", problems);
+  ASSERT_TRUE(cell);
+  EXPECT_FALSE(cell->plmn);
+  EXPECT_FALSE(cell->lac);
+  EXPECT_FALSE(cell->channel);
+  EXPECT_FALSE(cell->psc);
+  EXPECT_EQ(cell->rscp, -80.0);
+  EXPECT_FALSE(cell->ecio);
+  EXPECT_THAT(problems, SizeIs(5));
+}
+
+TEST(ReadingABearer, TakesAConnectedOnesSettingsAndAddresses) {
+  Problems problems;
+  const auto properties = std::make_shared<const Dict>(
+      Dict{{"apn", s("internet")}, {"ip-type", u(MM_BEARER_IP_FAMILY_IPV4V6)}});
+  const auto ip4 = std::make_shared<const Dict>(
+      Dict{{"address", s("10.1.2.3")}, {"dns1", s("8.8.8.8")}, {"dns2", s("not an address")}});
+  const auto ip6 = std::make_shared<const Dict>(Dict{{"address", s("2001:db8::1")}});
+  const std::optional<Bearer> bearer = readBearer({{"Connected", b(true)},
+                                                   {"Properties", {"a{sv}", properties}},
+                                                   {"Ip4Config", {"a{sv}", ip4}},
+                                                   {"Ip6Config", {"a{sv}", ip6}},
+                                                   {"ProfileId", {"i", std::int64_t{-1}}}},
+                                                  "Bearer 1", problems);
+  ASSERT_TRUE(bearer);
+  EXPECT_EQ(bearer->apn, "internet");
+  EXPECT_EQ(bearer->ipFamily, static_cast<std::uint32_t>(MM_BEARER_IP_FAMILY_IPV4V6));
+  EXPECT_FALSE(bearer->profileId);
+  EXPECT_EQ(bearer->ip4, (platform::Bytes{10, 1, 2, 3}));
+  EXPECT_THAT(bearer->ip6, ::testing::Optional(SizeIs(16)));
+  EXPECT_THAT(bearer->dns, ElementsAre(platform::Bytes{8, 8, 8, 8}));
+  EXPECT_THAT(problems, ElementsAre("Bearer 1 Ip4Config \"dns2\": \"not an address\" is not an IP "
+                                    "address; dropped"));
+
+  EXPECT_FALSE(readBearer({{"Connected", b(false)}}, "Bearer 2", problems));
+}
+
+TEST(ReadingTheRegistration, LeavesWhatModemManagerCallsUnknownAbsent) {
+  Problems problems;
+  const Registration known =
+      readRegistration({{"AccessTechnologies", u(MM_MODEM_ACCESS_TECHNOLOGY_LTE)}},
+                       {{"RegistrationState", u(MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING)},
+                        {"EpsUeModeOperation", u(MM_MODEM_3GPP_EPS_UE_MODE_OPERATION_CSPS_2)}},
+                       problems);
+  EXPECT_EQ(known.state, static_cast<std::uint32_t>(MM_MODEM_3GPP_REGISTRATION_STATE_ROAMING));
+  EXPECT_EQ(known.epsUeMode, 4u);
+  const Registration unknown =
+      readRegistration({{"AccessTechnologies", u(MM_MODEM_ACCESS_TECHNOLOGY_UNKNOWN)}},
+                       {{"RegistrationState", u(MM_MODEM_3GPP_REGISTRATION_STATE_UNKNOWN)},
+                        {"EpsUeModeOperation", u(MM_MODEM_3GPP_EPS_UE_MODE_OPERATION_UNKNOWN)},
+                        {"PacketServiceState", u(MM_MODEM_3GPP_PACKET_SERVICE_STATE_UNKNOWN)}},
+                       problems);
+  EXPECT_FALSE(unknown.accessTechnologies);
+  EXPECT_FALSE(unknown.state);
+  EXPECT_FALSE(unknown.epsUeMode);
+  EXPECT_FALSE(unknown.packetService);
+  EXPECT_THAT(problems, IsEmpty());
+}
+
+}  // namespace
+}  // namespace tarn::mm

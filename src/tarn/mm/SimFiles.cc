@@ -1,0 +1,63 @@
+#include "tarn/mm/SimFiles.h"
+
+#include <algorithm>
+#include <memory>
+
+#include "messages/Records.h"
+#include "radio/Iccid.h"
+#include "radio/Imsi.h"
+#include "tarn/mm/MetricIds.h"
+
+namespace tarn::mm {
+namespace {
+
+constexpr std::uint32_t kEfIccid = 0x2FE2;
+constexpr std::uint32_t kEfImsi = 0x6F07;
+constexpr std::uint32_t kEfSpn = 0x6F46;
+constexpr std::size_t kSpnNameBytes = 16;
+
+// The characters that the GSM default alphabet codes as ASCII does.
+bool gsmAsAscii(char c) {
+  return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') ||
+         std::string_view(" !\"#%&'()*+,-./:;<=>?").find(c) != std::string_view::npos;
+}
+
+}  // namespace
+
+std::optional<platform::Bytes> encodeEfSpn(std::string_view name) {
+  if (name.size() > kSpnNameBytes || !std::all_of(name.begin(), name.end(), gsmAsAscii))
+    return std::nullopt;
+  platform::Bytes content(1 + kSpnNameBytes, 0xFF);
+  content[0] = 0;
+  std::copy(name.begin(), name.end(), content.begin() + 1);
+  return content;
+}
+
+std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs) {
+  messages::KCellularSimCardFiles record;
+  record.setTimestamp(atMs);
+  const auto add = [&record](std::uint32_t id, std::optional<platform::Bytes> content) {
+    if (!content) return;
+    auto file = std::make_shared<messages::ElementaryFile>();
+    file->setEfId(id);
+    file->setContent(std::move(content));
+    record.addEfList(std::move(file));
+  };
+  if (sim.iccid) add(kEfIccid, radio::encodeEfIccid(*sim.iccid));
+  if (sim.imsi) add(kEfImsi, radio::encodeEfImsi(*sim.imsi));
+  if (sim.serviceProvider) add(kEfSpn, encodeEfSpn(*sim.serviceProvider));
+  if (record.efListsCount() == 0) return std::nullopt;
+  return service::Metric{metric::kSimFiles, record.data()};
+}
+
+std::optional<service::Metric> mmCommonInfoMetric(const Sim& sim, std::uint64_t atMs) {
+  if (!sim.imsi) return std::nullopt;
+  std::optional<platform::Bytes> imsi = radio::encodeEfImsi(*sim.imsi);
+  if (!imsi) return std::nullopt;
+  messages::KCellularMmCommonInfo record;
+  record.setTimestamp(atMs);
+  record.setImsi(std::move(imsi));
+  return service::Metric{metric::kMmCommonInfo, record.data()};
+}
+
+}  // namespace tarn::mm

@@ -1,0 +1,256 @@
+// The fake modem's scripted drive end to end: through tarnd --source modemmanager on a bus of
+// its own and a client's store, and through the service built into norvo.
+#include "Drive.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <csignal>
+#include <functional>
+
+#include "FakeModemManager.h"
+#include "PrivateBus.h"
+#include "Tarnd.h"
+#include "TemporaryFolder.h"
+#include "app/ServiceOption.h"
+#include "client/TarnWrapper.h"
+#include "platform/MainQueue.h"
+#include "screens/SecondLevelViewController.h"
+#include "store/MetricValidator.h"
+#include "tarn/client/Transport.h"
+#include "tarn/dbus/BusTransport.h"
+#include "tarn/mm/ModemManagerSource.h"
+
+namespace mmtest {
+namespace {
+
+using namespace std::chrono_literals;
+using platform::Dictionary;
+using store::MetricValidator;
+namespace mm = tarn::mm;
+
+constexpr auto kStepTimeout = 20s;
+
+std::optional<double> numberIn(const std::optional<Dictionary>& dictionary, std::string_view key) {
+  if (!dictionary) return std::nullopt;
+  const platform::Value* value = dictionary->find(key);
+  return value != nullptr ? value->asDouble() : std::nullopt;
+}
+
+std::optional<double> firstRow(const platform::List& list, std::string_view key) {
+  if (list.empty() || list.at(0).asDictionary() == nullptr) return std::nullopt;
+  return numberIn(*list.at(0).asDictionary(), key);
+}
+
+std::string firstRowText(const platform::List& list, std::string_view key) {
+  if (list.empty() || list.at(0).asDictionary() == nullptr) return {};
+  const platform::Value* value = list.at(0).asDictionary()->find(key);
+  return value != nullptr && value->asString() != nullptr ? *value->asString() : std::string();
+}
+
+// A client session whose metrics fill a store of its own, as the viewer's do.
+class StoreSession {
+ public:
+  StoreSession() {
+    session_.setDelegate(store_);
+    EXPECT_TRUE(session_.addVelaConfigForAppId("vexmora",
+                                               NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
+    session_.listen();
+  }
+
+  MetricValidator& store() { return *store_; }
+
+  // Runs the main queue until `shown` holds for the store.
+  bool shows(const std::function<bool(const MetricValidator&)>& shown) {
+    return platform::runMainQueueUntil([&] { return shown(*store_); }, kStepTimeout);
+  }
+
+ private:
+  std::shared_ptr<MetricValidator> store_ = std::make_shared<MetricValidator>(nullptr);
+  TarnWrapper session_;
+};
+
+// The rows, name and value, that the detail screen of `launch` and `item` shows.
+std::vector<std::pair<std::string, std::string>> screenRows(MetricValidator& store,
+                                                            std::string launch, std::string item) {
+  SecondLevelViewController screen(store);
+  screen.tableView().registerPrototype(
+      ui::TableViewCell("SecondClickView", ui::CellStyle::RightDetail));
+  screen.setFirstSelection(std::move(launch));
+  screen.setSeguedThroughRow(std::move(item));
+  screen.tableView().reloadData();
+  std::vector<std::pair<std::string, std::string>> rows;
+  for (const auto& section : screen.tableView().sections()) {
+    for (const auto& cell : section.cells)
+      rows.emplace_back(cell->textLabel()->text.value_or(""),
+                        cell->detailTextLabel()->text.value_or(""));
+  }
+  return rows;
+}
+
+using Row = std::pair<std::string, std::string>;
+
+const auto lteShownWithPci = [](double pci) {
+  return [pci](const MetricValidator& store) {
+    return numberIn(store.myLTESCellInfoDict(), "phy_cell_id") == pci;
+  };
+};
+
+// Plays the drive on `fake` and checks each step in `session`'s store.
+void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
+  const std::string modem = FakeModemManager::modemPath(0);
+  // LTE with neighbours of all three technologies.
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return numberIn(store.myLTESCellInfoDict(), "phy_cell_id") == 0x1A0 &&
+           firstRow(store.myLTE().EutraNbrsMeas, "nbr_rsrp") == -105 &&
+           firstRow(store.myLTE().EutraNbrsMeas, "nbr_rsrq") == -14.5 &&
+           firstRow(store.myLTE().UtraNbrsMeas, "rscp") == -90 &&
+           firstRow(store.myLTE().GeraNbrsMeas, "rxlev") == -80 &&
+           firstRow(store.myLTE().RsrpRsrqSinr, "rsrp0") == -97 &&
+           firstRow(store.myLTE().RsrpRsrqSinr, "sinr0") == 12.5;
+  }));
+
+  // The screens show it as they show a phone's.
+  EXPECT_THAT(screenRows(session.store(), "LTE", "Serving Cell Info"),
+              ::testing::IsSupersetOf({Row{"phy_cell_id", "416"}, Row{"dl_freq", "1300"},
+                                       Row{"freq_band_ind", "3"}, Row{"sel_plmn_mcc", "210"}}));
+  EXPECT_THAT(screenRows(session.store(), "LTE", "LTE Neighbor Cell Meas"),
+              ::testing::IsSupersetOf({Row{"nbr_phys_cell_id", "17"}, Row{"nbr_rsrp", "-105"},
+                                       Row{"nbr_rsrq", "-14.5"}}));
+
+  // A handover to PCI 17.
+  fake.setCells(0, {lteCell(true, 17, 1300, -92, -10), lteCell(false, 0x1A0, 1300, -104, -13)});
+  ASSERT_TRUE(session.shows(lteShownWithPci(17)));
+
+  // A drop to UMTS.
+  fake.setCells(0, {umtsCell(true, 300, 10700, -85, -6), gsmCell(false, 62, 42, 30)});
+  fake.set(modem, mm::kSignalInterface,
+           {{"Lte", property(Entries{})},
+            {"Umts", property(Entries{{"rscp", sdbus::Variant(-85.0)},
+                                      {"ecio", sdbus::Variant(-6.0)},
+                                      {"rssi", sdbus::Variant(-60.0)}})}});
+  fake.set(modem, mm::kModemInterface,
+           {{"AccessTechnologies", property(std::uint32_t{MM_MODEM_ACCESS_TECHNOLOGY_UMTS})}});
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return numberIn(store.myUMTSCellInfoDict(), "psc") == 300 &&
+           numberIn(store.myUMTSCellInfoDict(), "dl_uarfcn") == 10700 &&
+           firstRow(store.myUMTS().rXInfo, "rsrp_range") == -85 + 116 &&
+           firstRow(store.myUMTS().geraNbrMeas, "rxlev") == -80;
+  }));
+
+  // And on to GSM.
+  fake.setCells(0, {gsmCell(true, 62, 42, 33), umtsCell(false, 301, 10700, -101, -12.5)});
+  fake.set(
+      modem, mm::kSignalInterface,
+      {{"Umts", property(Entries{})}, {"Gsm", property(Entries{{"rssi", sdbus::Variant(-77.0)}})}});
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return numberIn(store.myGSMScellInfoDict(), "arfcn") == 62 &&
+           numberIn(store.myGSMScellInfoDict(), "bsic") == 42 &&
+           numberIn(store.myGSMIdleScellMeasDict(), "idle_rxlev_dBm") == -77 &&
+           firstRow(store.myGSM().utraNbrMeas, "cpich_rscp") == -101;
+  }));
+
+  EXPECT_THAT(screenRows(session.store(), "GSM", "Serving Cell Info"),
+              ::testing::IsSupersetOf({Row{"arfcn", "62"}, Row{"bsic", "42"}}));
+
+  // A bearer comes up...
+  fake.addBearer(
+      1, {{"Connected", property(true)},
+          {"Properties",
+           property(Entries{{"apn", sdbus::Variant(std::string("internet"))},
+                            {"ip-type", sdbus::Variant(std::uint32_t{MM_BEARER_IP_FAMILY_IPV4})}})},
+          {"Ip4Config", property(Entries{{"address", sdbus::Variant(std::string("10.1.2.3"))},
+                                         {"dns1", sdbus::Variant(std::string("8.8.8.8"))}})}});
+  fake.set(modem, mm::kModemInterface,
+           {{"Bearers", property(std::vector<sdbus::ObjectPath>{
+                            sdbus::ObjectPath(FakeModemManager::bearerPath(1))})}});
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return firstRowText(store.myCommon().activeBearer, "apn") == "internet" &&
+           numberIn(store.myCellularActiveBearerDict(), "bearer_context_count") == 1;
+  }));
+  // ...and goes down.
+  fake.set(FakeModemManager::bearerPath(1), mm::kBearerInterface, {{"Connected", property(false)}});
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return numberIn(store.myCellularActiveBearerDict(), "bearer_context_count") == 0;
+  }));
+
+  // The SIM is reported.
+  fake.addSim(0, {{"SimIdentifier", property(std::string("8931041010654378930"))},
+                  {"Imsi", property(std::string("310410123456789"))},
+                  {"OperatorName", property(std::string("Norvo"))}});
+  fake.set(modem, mm::kModemInterface,
+           {{"Sim", property(sdbus::ObjectPath(FakeModemManager::simPath(0)))}});
+  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
+    return store.myCommon().simContents.size() == 3 &&
+           firstRow(store.myCommon().simContents, "ef_id") == 0x2FE2;
+  }));
+}
+
+void addDriveModem(FakeModemManager& fake) {
+  fake.addModem(0, lteModem(kImei));
+  fake.setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11), lteCell(false, 17, 1300, -105, -14.5),
+                    umtsCell(false, 300, 10700, -90, -7.5), gsmCell(false, 62, 42, 30)});
+}
+
+// DBUS_SYSTEM_BUS_ADDRESS, pointed at a test's bus while this lives.
+class SystemBusAt {
+ public:
+  explicit SystemBusAt(const std::string& address) {
+    if (const char* saved = std::getenv(kVariable)) saved_ = saved;
+    setenv(kVariable, address.c_str(), 1);
+  }
+  ~SystemBusAt() {
+    if (saved_) {
+      setenv(kVariable, saved_->c_str(), 1);
+    } else {
+      unsetenv(kVariable);
+    }
+  }
+
+ private:
+  static constexpr const char* kVariable = "DBUS_SYSTEM_BUS_ADDRESS";
+  std::optional<std::string> saved_;
+};
+
+TEST(TheFakeModemsDrive, ReachesAClientsStoreThroughTarnd) {
+  bustest::TemporaryFolder folder;
+  bustest::PrivateBus bus;
+  FakeModemManager fake(bus.address());
+  addDriveModem(fake);
+  std::unique_ptr<bustest::ChildProcess> tarnd;
+  {
+    SystemBusAt systemBus(bus.address());
+    tarnd = bustest::startTarnd(bus.address(), {"--source", "modemmanager", "--refresh", "1"},
+                                folder / "tarnd");
+  }
+  ASSERT_TRUE(bus.waitForName("org.norvo.Tarn1", true)) << tarnd->standardError();
+  tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
+  {
+    StoreSession session;
+    driveAndCheck(fake, session);
+  }
+  tarn::client::useTransport(nullptr);
+  EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0) << tarnd->standardError();
+  EXPECT_NE(tarnd->standardError().find("tarnd: modemmanager: following modem 0"),
+            std::string::npos)
+      << tarnd->standardError();
+}
+
+TEST(TheFakeModemsDrive, ReachesTheStoreThroughTheServiceBuiltIntoNorvo) {
+  bustest::PrivateBus bus;
+  FakeModemManager fake(bus.address());
+  addDriveModem(fake);
+  app::useService(app::ServiceChoice{},
+                  std::make_shared<mm::ModemManagerSource>(
+                      mm::ModemManagerOptions{.bus = bus.address(), .modem = {}, .refresh = 200ms},
+                      [](const std::string&) {}));
+  {
+    StoreSession session;
+    driveAndCheck(fake, session);
+  }
+  tarn::client::useTransport(nullptr);
+}
+
+}  // namespace
+}  // namespace mmtest

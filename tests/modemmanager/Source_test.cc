@@ -1,0 +1,239 @@
+// The ModemManager source on a bus of its own, against a fake ModemManager: following a modem,
+// and what happens when ModemManager, the modem or polkit get in the way.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <mutex>
+
+#include "Drive.h"
+#include "Eventually.h"
+#include "FakeModemManager.h"
+#include "PrivateBus.h"
+#include "messages/Records.h"
+#include "tarn/mm/ModemManagerSource.h"
+#include "tarn/sim/MetricIds.h"
+
+namespace mmtest {
+namespace {
+
+using namespace std::chrono_literals;
+using bustest::eventually;
+using ::testing::Contains;
+using ::testing::HasSubstr;
+namespace ids = tarn::sim::metric_id;
+
+// What the source delivers and says, as it comes.
+class Seen {
+ public:
+  tarn::mm::StatusSink statusSink() {
+    return [this](const std::string& line) {
+      std::lock_guard lock(mutex_);
+      lines_.push_back(line);
+    };
+  }
+  std::function<void(tarn::service::Metric)> deliverSink() {
+    return [this](tarn::service::Metric metric) {
+      std::lock_guard lock(mutex_);
+      metrics_.push_back(std::move(metric));
+    };
+  }
+  std::vector<std::string> lines() const {
+    std::lock_guard lock(mutex_);
+    return lines_;
+  }
+  std::size_t count(std::string_view fragment) const {
+    const std::vector<std::string> all = lines();
+    return static_cast<std::size_t>(std::count_if(all.begin(), all.end(), [&](auto& line) {
+      return line.find(fragment) != std::string::npos;
+    }));
+  }
+  bool said(std::string_view fragment) const { return count(fragment) > 0; }
+  // The last metric of `metricId` decoded with `Record`, if one came.
+  template <class Record>
+  std::shared_ptr<Record> last(std::uint32_t metricId) const {
+    std::lock_guard lock(mutex_);
+    for (auto metric = metrics_.rbegin(); metric != metrics_.rend(); ++metric) {
+      if (metric->metricId == metricId) return Record::initWithData(&metric->payload);
+    }
+    return nullptr;
+  }
+  void clear() {
+    std::lock_guard lock(mutex_);
+    metrics_.clear();
+    lines_.clear();
+  }
+
+ private:
+  mutable std::mutex mutex_;
+  std::vector<std::string> lines_;
+  std::vector<tarn::service::Metric> metrics_;
+};
+
+class ModemManagerSourceTest : public ::testing::Test {
+ protected:
+  void startSource(std::string modem = {}) {
+    source = std::make_unique<tarn::mm::ModemManagerSource>(
+        tarn::mm::ModemManagerOptions{.bus = bus.address(), .modem = modem, .refresh = 100ms},
+        seen.statusSink());
+    source->start(seen.deliverSink());
+  }
+
+  // The serving PCI of the last LTE serving cell metric, or -1.
+  std::int64_t servingPci() const {
+    const auto info = seen.last<messages::KCellularLteScellInfo>(ids::kLteServingCellInfo);
+    return info && info->hasPhyCellId() ? std::int64_t{info->phyCellId()} : -1;
+  }
+
+  bustest::PrivateBus bus;
+  std::unique_ptr<FakeModemManager> fake = std::make_unique<FakeModemManager>(bus.address());
+  Seen seen;
+  std::unique_ptr<tarn::mm::ModemManagerSource> source;  // stops first
+};
+
+TEST_F(ModemManagerSourceTest, FollowsTheFirstModemThroughAHandover) {
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11), lteCell(false, 17, 1300, -105, -14.5)});
+  startSource();
+  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }))
+      << ::testing::PrintToString(seen.lines());
+  EXPECT_EQ(fake->setupRate(0), 1u);
+  EXPECT_THAT(seen.lines(), Contains("following modem 0 (/org/freedesktop/ModemManager1/Modem/0, "
+                                     "Fake EG25, 490154203237518)"));
+  const auto neighbours = seen.last<messages::KCellularLteNbrEutraCellMeas>(ids::kLteNeighbourMeas);
+  ASSERT_TRUE(neighbours);
+  ASSERT_EQ(neighbours->measNbrEutrasCount(), 1u);
+  EXPECT_EQ(neighbours->measNbrEutraAtIndex(0)->nbrRsrp(), -105 + 140);
+
+  fake->setCells(0, {lteCell(true, 17, 1300, -90, -9), lteCell(false, 0x1A0, 1300, -108, -15)});
+  EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
+}
+
+TEST_F(ModemManagerSourceTest, SaysOnceWhenPolkitRefusesAndGoesOnWithTheSignal) {
+  fake->refuseDeviceControl(true);
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  startSource();
+  ASSERT_TRUE(eventually([&] {
+    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr) != nullptr;
+  }));
+  // Several refreshes later, still one line each.
+  seen.clear();
+  ASSERT_TRUE(eventually([&] {
+    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr) != nullptr;
+  }));
+  ASSERT_TRUE(eventually(
+      [&] { return seen.last<messages::KCellularEmmContext>(ids::kEmmContext) != nullptr; }));
+  EXPECT_EQ(seen.count("refused"), 0u);
+  EXPECT_EQ(fake->cellInfoCalls(0), 1u);
+  EXPECT_EQ(servingPci(), -1);
+  const auto sample = seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr);
+  EXPECT_EQ(sample->instValuesAtIndex(0)->rsrp0(), -97);
+}
+
+TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionInOneLine) {
+  fake->refuseDeviceControl(true);
+  fake->addModem(0, lteModem(kImei));
+  startSource();
+  ASSERT_TRUE(eventually([&] { return seen.count("refused") == 2; }));
+  EXPECT_THAT(seen.lines(),
+              Contains("ModemManager refused GetCellInfo: this user lacks the polkit action "
+                       "org.freedesktop.ModemManager1.Device.Control; docs/modemmanager.md gives "
+                       "the rule that grants it. Going on with what can still be read"));
+  EXPECT_TRUE(seen.said("ModemManager refused Signal.Setup"));
+}
+
+TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRest) {
+  fake->addModem(0, lteModem(kImei));
+  Entries serving = lteCell(true, 0x1A0, 1300, -97, -11);
+  serving["earfcn"] = sdbus::Variant(std::string("1300"));
+  fake->setCells(0, {serving});
+  startSource();
+  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
+  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0 && seen.count("earfcn") == 1; }));
+  EXPECT_FALSE(seen.last<messages::KCellularLteScellInfo>(ids::kLteServingCellInfo)->hasDlFreq());
+  EXPECT_THAT(seen.lines(), Contains("cell 0 \"earfcn\": wanted u, got s; dropped"));
+}
+
+TEST_F(ModemManagerSourceTest, MovesToTheNextModemWhenItsModemGoesAndStaysWithIt) {
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  fake->addModem(1, lteModem(kSecondImei));
+  fake->setCells(1, {lteCell(true, 33, 6300, -100, -12)});
+  startSource();
+  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
+
+  fake->removeModem(0);
+  ASSERT_TRUE(eventually([&] { return servingPci() == 33; }));
+  EXPECT_TRUE(seen.said("modem 0 has gone away"));
+  EXPECT_TRUE(seen.said("following modem 1 "));
+
+  fake->addModem(0, lteModem(kImei));
+  seen.clear();
+  ASSERT_TRUE(eventually([&] { return servingPci() == 33; }));
+  EXPECT_FALSE(seen.said("following"));
+}
+
+TEST_F(ModemManagerSourceTest, PicksTheModemOfAnImeiAndWaitsForIt) {
+  startSource(std::string(kSecondImei));
+  ASSERT_TRUE(eventually([&] { return seen.said("ModemManager has no modem 356938035643809"); }))
+      << ::testing::PrintToString(seen.lines());
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  fake->addModem(4, lteModem(kSecondImei));
+  fake->setCells(4, {lteCell(true, 33, 6300, -100, -12)});
+  ASSERT_TRUE(eventually([&] { return servingPci() == 33; }));
+  EXPECT_TRUE(seen.said("following modem 4 "));
+}
+
+TEST_F(ModemManagerSourceTest, WaitsForModemManagerAndFollowsItThroughARestart) {
+  fake.reset();
+  startSource();
+  ASSERT_TRUE(eventually([&] { return seen.said("ModemManager is not running"); }));
+  fake = std::make_unique<FakeModemManager>(bus.address());
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
+
+  fake.reset();
+  ASSERT_TRUE(eventually([&] { return seen.said("ModemManager has left the bus"); }));
+  EXPECT_TRUE(seen.said("modem 0 has gone away"));
+  fake = std::make_unique<FakeModemManager>(bus.address());
+  fake->addModem(0, lteModem(kImei));
+  fake->setCells(0, {lteCell(true, 17, 1300, -97, -11)});
+  EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
+}
+
+TEST_F(ModemManagerSourceTest, ReportsTheInitialEpsBearerAmongTheActiveBearers) {
+  FakeModemManager::Modem modem = lteModem(kImei);
+  modem.modem3gpp["InitialEpsBearer"] =
+      property(sdbus::ObjectPath(FakeModemManager::bearerPath(7)));
+  fake->addBearer(7,
+                  {{"Connected", property(true)},
+                   {"Properties", property(Entries{{"apn", sdbus::Variant(std::string("ims"))}})}});
+  fake->addModem(0, std::move(modem));
+  startSource();
+  ASSERT_TRUE(eventually([&] {
+    const auto bearers = seen.last<messages::KCellularActivatedBearerContexts>(ids::kActiveBearers);
+    return bearers && bearers->bearerContextsCount() == 1 &&
+           bearers->bearerContextsAtIndex(0)->apn() == "ims";
+  }));
+}
+
+TEST_F(ModemManagerSourceTest, SaysWhenTheModemIsLockedOrDisabled) {
+  FakeModemManager::Modem locked = lteModem(kImei);
+  locked.modem["State"] = property(std::int32_t{MM_MODEM_STATE_LOCKED});
+  fake->addModem(2, std::move(locked));
+  startSource();
+  ASSERT_TRUE(eventually([&] { return seen.said("modem 2 is locked"); }));
+  fake->set(FakeModemManager::modemPath(2), tarn::mm::kModemInterface,
+            {{"State", property(std::int32_t{MM_MODEM_STATE_DISABLED})}});
+  ASSERT_TRUE(
+      eventually([&] { return seen.said("modem 2 is disabled; mmcli -m 2 -e enables it"); }));
+  fake->set(FakeModemManager::modemPath(2), tarn::mm::kModemInterface,
+            {{"State", property(std::int32_t{MM_MODEM_STATE_REGISTERED})}});
+  EXPECT_TRUE(eventually([&] { return seen.said("modem 2 is enabled"); }));
+}
+
+}  // namespace
+}  // namespace mmtest

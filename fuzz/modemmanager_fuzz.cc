@@ -11,6 +11,7 @@
 #include <utility>
 
 #include "codec/Reader.h"
+#include "messages/Metrics.h"
 #include "messages/RecordClass.h"
 #include "messages/Records.h"
 #include "tarn/mm/Metrics.h"
@@ -129,27 +130,6 @@ Dict dictionary(Input& input, int depth) {
   return dict;
 }
 
-// The record class of each metric the source makes.
-constexpr std::pair<std::uint32_t, std::string_view> kRecordClasses[] = {
-    {0x3C40C2, "KCellularLteScellInfo"},
-    {0x3CD301, "KCellularLteServingCellMeasurement"},
-    {0x3C4F6A, "KCellularLteRsrpRsrqSinr"},
-    {0x3CD30F, "KCellularLteNbrEutraCellMeas"},
-    {0x3CD310, "KCellularLteNbrInterRatCellMeas"},
-    {0x3C300C, "KCellularWcdmaCellInfo"},
-    {0x3CD102, "KCellularWcdmaScellMeasurement"},
-    {0x3CD105, "KCellularWcdmaNbrCellMeas"},
-    {0x3C2E0C, "KCellularGsmScellInfo"},
-    {0x3CD002, "KCellularGsmIdleScellMeasurement"},
-    {0x3CD009, "KCellularGsmGrrEventMeasCr"},
-    {0x3CD50A, "KCellularMmContext"},
-    {0x3CD50B, "KCellularGmmContext"},
-    {0x3CD50C, "KCellularEmmContext"},
-    {0x3CD509, "KCellularMmCommonInfo"},
-    {0x3CD50D, "KCellularActivatedBearerContexts"},
-    {0x3C0013, "KCellularSimCardFiles"},
-};
-
 [[noreturn]] void fail(std::uint32_t metricId, const char* what) {
   std::fprintf(stderr, "metric %X: %s\n", metricId, what);
   std::abort();
@@ -157,15 +137,15 @@ constexpr std::pair<std::uint32_t, std::string_view> kRecordClasses[] = {
 
 // The metric's payload decodes with its record class and encodes back to the same bytes.
 void mustDecode(const tarn::service::Metric& metric) {
-  for (const auto& [metricId, className] : kRecordClasses) {
-    if (metricId != metric.metricId) continue;
-    const auto record = messages::recordClassNamed(className)->create();
+  for (const messages::MetricKind& kind : messages::kMetricKinds) {
+    if (kind.metricID != metric.metricId || kind.recordClass.empty()) continue;
+    const auto record = messages::recordClassNamed(kind.recordClass)->create();
     codec::Reader reader(metric.payload);
     if (!record->readFrom(reader)) fail(metric.metricId, "does not decode");
     if (record->data() != metric.payload) fail(metric.metricId, "encodes to other bytes");
     return;
   }
-  fail(metric.metricId, "is not a metric the source makes");
+  fail(metric.metricId, "is not a metric a record carries");
 }
 
 }  // namespace

@@ -52,12 +52,9 @@ std::string firstRowText(const platform::List& list, std::string_view key) {
 // A client session whose metrics fill a store of its own, as the viewer's do.
 class StoreSession {
  public:
-  StoreSession() {
-    session_.setDelegate(store_);
-    EXPECT_TRUE(session_.addVelaConfigForAppId("vexmora",
-                                               NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
-    session_.listen();
-  }
+  // Over the transport the application chose, or over `transport`.
+  StoreSession() { start(); }
+  explicit StoreSession(tarn::client::Transport& transport) : session_(transport) { start(); }
 
   MetricValidator& store() { return *store_; }
 
@@ -67,6 +64,13 @@ class StoreSession {
   }
 
  private:
+  void start() {
+    session_.setDelegate(store_);
+    EXPECT_TRUE(session_.addVelaConfigForAppId("vexmora",
+                                               NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
+    session_.listen();
+  }
+
   std::shared_ptr<MetricValidator> store_ = std::make_shared<MetricValidator>(nullptr);
   TarnWrapper session_;
 };
@@ -225,12 +229,11 @@ TEST(TheFakeModemsDrive, ReachesAClientsStoreThroughTarnd) {
                                 folder / "tarnd");
   }
   ASSERT_TRUE(bus.waitForName("org.norvo.Tarn1", true)) << tarnd->standardError();
-  tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
+  tarn::dbus::BusTransport transport(bus.address());
   {
-    StoreSession session;
+    StoreSession session(transport);
     driveAndCheck(fake, session);
   }
-  tarn::client::useTransport(nullptr);
   EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0) << tarnd->standardError();
   EXPECT_NE(tarnd->standardError().find("tarnd: modemmanager: following modem 0"),
             std::string::npos)

@@ -10,9 +10,9 @@
 #include "Eventually.h"
 #include "FakeModemManager.h"
 #include "PrivateBus.h"
+#include "messages/Metrics.h"
 #include "messages/Records.h"
 #include "tarn/mm/ModemManagerSource.h"
-#include "tarn/sim/MetricIds.h"
 
 namespace mmtest {
 namespace {
@@ -21,7 +21,7 @@ using namespace std::chrono_literals;
 using bustest::eventually;
 using ::testing::Contains;
 using ::testing::HasSubstr;
-namespace ids = tarn::sim::metric_id;
+namespace ids = messages::metric;
 
 // What the source delivers and says, as it comes.
 class Seen {
@@ -81,7 +81,7 @@ class ModemManagerSourceTest : public ::testing::Test {
 
   // The serving PCI of the last LTE serving cell metric, or -1.
   std::int64_t servingPci() const {
-    const auto info = seen.last<messages::KCellularLteScellInfo>(ids::kLteServingCellInfo);
+    const auto info = seen.last<messages::KCellularLteScellInfo>(ids::KCellularLteScellInfo);
     return info && info->hasPhyCellId() ? std::int64_t{info->phyCellId()} : -1;
   }
 
@@ -100,7 +100,8 @@ TEST_F(ModemManagerSourceTest, FollowsTheFirstModemThroughAHandover) {
   EXPECT_EQ(fake->setupRate(0), 1u);
   EXPECT_THAT(seen.lines(), Contains("following modem 0 (/org/freedesktop/ModemManager1/Modem/0, "
                                      "Fake EG25, 490154203237518)"));
-  const auto neighbours = seen.last<messages::KCellularLteNbrEutraCellMeas>(ids::kLteNeighbourMeas);
+  const auto neighbours =
+      seen.last<messages::KCellularLteNbrEutraCellMeas>(ids::KCellularLteNbrEutraCellMeas);
   ASSERT_TRUE(neighbours);
   ASSERT_EQ(neighbours->measNbrEutrasCount(), 1u);
   EXPECT_EQ(neighbours->measNbrEutraAtIndex(0)->nbrRsrp(), -105 + 140);
@@ -115,19 +116,20 @@ TEST_F(ModemManagerSourceTest, SaysOnceWhenPolkitRefusesAndGoesOnWithTheSignal) 
   fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
   startSource();
   ASSERT_TRUE(eventually([&] {
-    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr) != nullptr;
+    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr) != nullptr;
   }));
   // Several refreshes later, still one line each.
   seen.clear();
   ASSERT_TRUE(eventually([&] {
-    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr) != nullptr;
+    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr) != nullptr;
   }));
-  ASSERT_TRUE(eventually(
-      [&] { return seen.last<messages::KCellularEmmContext>(ids::kEmmContext) != nullptr; }));
+  ASSERT_TRUE(eventually([&] {
+    return seen.last<messages::KCellularEmmContext>(ids::KCellularEmmContext) != nullptr;
+  }));
   EXPECT_EQ(seen.count("refused"), 0u);
   EXPECT_EQ(fake->cellInfoCalls(0), 1u);
   EXPECT_EQ(servingPci(), -1);
-  const auto sample = seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::kLteRsrpRsrqSinr);
+  const auto sample = seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr);
   EXPECT_EQ(sample->instValuesAtIndex(0)->rsrp0(), -97);
 }
 
@@ -151,7 +153,7 @@ TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRe
   startSource();
   ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
   ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0 && seen.count("earfcn") == 1; }));
-  EXPECT_FALSE(seen.last<messages::KCellularLteScellInfo>(ids::kLteServingCellInfo)->hasDlFreq());
+  EXPECT_FALSE(seen.last<messages::KCellularLteScellInfo>(ids::KCellularLteScellInfo)->hasDlFreq());
   EXPECT_THAT(seen.lines(), Contains("cell 0 \"earfcn\": wanted u, got s; dropped"));
 }
 
@@ -214,7 +216,8 @@ TEST_F(ModemManagerSourceTest, ReportsTheInitialEpsBearerAmongTheActiveBearers) 
   fake->addModem(0, std::move(modem));
   startSource();
   ASSERT_TRUE(eventually([&] {
-    const auto bearers = seen.last<messages::KCellularActivatedBearerContexts>(ids::kActiveBearers);
+    const auto bearers = seen.last<messages::KCellularActivatedBearerContexts>(
+        ids::KCellularActivatedBearerContexts);
     return bearers && bearers->bearerContextsCount() == 1 &&
            bearers->bearerContextsAtIndex(0)->apn() == "ims";
   }));

@@ -6,6 +6,7 @@
 #include <memory>
 #include <utility>
 
+#include "messages/Metrics.h"
 #include "messages/Records.h"
 #include "platform/Format.h"
 #include "radio/GsmBands.h"
@@ -13,7 +14,6 @@
 #include "radio/Plmn.h"
 #include "radio/UmtsBands.h"
 #include "tarn/mm/BasebandUnits.h"
-#include "tarn/mm/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
@@ -203,7 +203,7 @@ std::optional<service::Metric> lteServingCellInfo(const Cell& cell, std::uint64_
     record.setSelPlmnMnc(cell.plmn->mnc);
     record.setNumMncDigits(cell.plmn->mncDigits);
   }
-  return ifFilled(metric::kLteServingCellInfo, record,
+  return ifFilled(messages::metric::KCellularLteScellInfo, record,
                   cell.pci || cell.channel || cell.cellId || cell.tac || cell.plmn);
 }
 
@@ -223,7 +223,7 @@ std::optional<service::Metric> lteServingMeasurement(const LteSignal& signal, co
   const bool filled =
       info->hasRssi() || info->hasRsrpRange() || info->hasRsrqRange() || info->hasSnr();
   record.addRxInfo(std::move(info));
-  return ifFilled(metric::kLteServingCellMeas, record, filled);
+  return ifFilled(messages::metric::KCellularLteServingCellMeasurement, record, filled);
 }
 
 std::optional<service::Metric> lteRsrpRsrqSinr(const LteSignal& signal, const Cell* cell,
@@ -240,7 +240,7 @@ std::optional<service::Metric> lteRsrpRsrqSinr(const LteSignal& signal, const Ce
   KCellularLteRsrpRsrqSinr record;
   record.setTimestamp(atMs);
   record.addInstValues(std::move(sample));
-  return service::Metric{metric::kLteRsrpRsrqSinr, record.data()};
+  return service::Metric{messages::metric::KCellularLteRsrpRsrqSinr, record.data()};
 }
 
 std::optional<service::Metric> lteNeighbours(const Snapshot& snapshot, std::uint64_t atMs,
@@ -258,7 +258,8 @@ std::optional<service::Metric> lteNeighbours(const Snapshot& snapshot, std::uint
         encode(cell->rsrq, &units::rsrqIndex, "neighbour RSRQ"));
     record.addMeasNbrEutra(std::move(neighbour));
   }
-  return ifFilled(metric::kLteNeighbourMeas, record, record.measNbrEutrasCount() > 0);
+  return ifFilled(messages::metric::KCellularLteNbrEutraCellMeas, record,
+                  record.measNbrEutrasCount() > 0);
 }
 
 std::optional<service::Metric> lteInterRatNeighbours(const Snapshot& snapshot, std::uint64_t atMs,
@@ -282,7 +283,7 @@ std::optional<service::Metric> lteInterRatNeighbours(const Snapshot& snapshot, s
     put(*neighbour, &EgwErrcNbrGeranMeas::setRxlev, cell->rxLevel);
     record.addMeasNbrGeran(std::move(neighbour));
   }
-  return ifFilled(metric::kLteInterRatMeas, record,
+  return ifFilled(messages::metric::KCellularLteNbrInterRatCellMeas, record,
                   record.measNbrUtrasCount() + record.measNbrGeransCount() > 0);
 }
 
@@ -303,7 +304,7 @@ std::optional<service::Metric> emmContext(const Registration& registration, cons
   if (registration.epsUeMode) {
     record.setUeOpMode(static_cast<KCellularEmmContext::UeOpMode>(*registration.epsUeMode - 1));
   }
-  return ifFilled(metric::kEmmContext, record,
+  return ifFilled(messages::metric::KCellularEmmContext, record,
                   status || registration.epsUeMode || record.taiListsCount() > 0);
 }
 
@@ -323,7 +324,7 @@ std::optional<service::Metric> umtsServingCellInfo(const Cell& cell, std::uint64
   put(record, &KCellularWcdmaCellInfo::setWcdmaBand,
       sysBand(kUmtsSysBands, umtsBand(cell.channel)));
   put(record, &KCellularWcdmaCellInfo::setPsc, cell.psc);
-  return ifFilled(metric::kUmtsServingCellInfo, record,
+  return ifFilled(messages::metric::KCellularWcdmaCellInfo, record,
                   cell.plmn || cell.lac || cell.cellId || cell.channel || cell.psc);
 }
 
@@ -341,7 +342,7 @@ std::optional<service::Metric> umtsServingMeasurement(const UmtsSignal& signal, 
   KCellularWcdmaScellMeasurement record;
   record.setTimestamp(atMs);
   record.addRxInfo(std::move(info));
-  return ifFilled(metric::kUmtsServingCellMeas, record, filled);
+  return ifFilled(messages::metric::KCellularWcdmaScellMeasurement, record, filled);
 }
 
 std::optional<service::Metric> umtsNeighbours(const Snapshot& snapshot, std::uint64_t atMs,
@@ -378,7 +379,7 @@ std::optional<service::Metric> umtsNeighbours(const Snapshot& snapshot, std::uin
     record.addMeasLteResult(std::move(result));
   }
   return ifFilled(
-      metric::kUmtsNeighbourMeas, record,
+      messages::metric::KCellularWcdmaNbrCellMeas, record,
       record.measUtraResultsCount() + record.measGsmResultsCount() + record.measLteResultsCount() >
           0);
 }
@@ -398,7 +399,7 @@ std::optional<service::Metric> gsmServingCellInfo(const Cell& cell, std::uint64_
   put(record, &KCellularGsmScellInfo::setArfcn, cell.channel);
   put(record, &KCellularGsmScellInfo::setBsic, cell.bsic);
   put(record, &KCellularGsmScellInfo::setGsmBand, sysBand(kGsmSysBands, gsmBand(cell.channel)));
-  return ifFilled(metric::kGsmServingCellInfo, record,
+  return ifFilled(messages::metric::KCellularGsmScellInfo, record,
                   cell.plmn || cell.lac || cell.cellId || cell.channel || cell.bsic);
 }
 
@@ -415,7 +416,7 @@ std::optional<service::Metric> gsmServingMeasurement(const GsmSignal& signal, co
   record.setTimestamp(atMs);
   if (cell != nullptr) put(record, &KCellularGsmIdleScellMeasurement::setScellArfcn, cell->channel);
   put(record, &KCellularGsmIdleScellMeasurement::setIdleRxlevDBm, rxlevDbm);
-  return ifFilled(metric::kGsmIdleServingMeas, record, rxlevDbm.has_value());
+  return ifFilled(messages::metric::KCellularGsmIdleScellMeasurement, record, rxlevDbm.has_value());
 }
 
 std::optional<service::Metric> gsmNeighbours(const Snapshot& snapshot, std::uint64_t atMs,
@@ -456,7 +457,7 @@ std::optional<service::Metric> gsmNeighbours(const Snapshot& snapshot, std::uint
     record.addLteNcellMeas(std::move(neighbour));
   }
   return ifFilled(
-      metric::kGsmNeighbourMeas, record,
+      messages::metric::KCellularGsmGrrEventMeasCr, record,
       record.gsmNcellMeasCount() + record.umtsNcellMeasCount() + record.lteNcellMeasCount() > 0);
 }
 
@@ -474,7 +475,7 @@ std::optional<service::Metric> mmContext(const Registration& registration, const
     lai->setLac(*cell->lac);
     record.setLai(std::move(lai));
   }
-  return ifFilled(metric::kMmContext, record, status || record.hasLai());
+  return ifFilled(messages::metric::KCellularMmContext, record, status || record.hasLai());
 }
 
 std::optional<service::Metric> gmmContext(const Registration& registration, const Cell* cell,
@@ -491,7 +492,7 @@ std::optional<service::Metric> gmmContext(const Registration& registration, cons
     rai->setLac(*cell->lac);
     record.setRai(std::move(rai));
   }
-  return ifFilled(metric::kGmmContext, record, status || record.hasRai());
+  return ifFilled(messages::metric::KCellularGmmContext, record, status || record.hasRai());
 }
 
 }  // namespace
@@ -587,7 +588,7 @@ service::Metric bearerMetric(const std::vector<Bearer>& connected, std::uint64_t
     }
     record.addBearerContexts(std::move(context));
   }
-  return {metric::kActiveBearers, record.data()};
+  return {messages::metric::KCellularActivatedBearerContexts, record.data()};
 }
 
 }  // namespace tarn::mm

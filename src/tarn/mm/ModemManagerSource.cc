@@ -2,9 +2,9 @@
 
 #include <sdbus-c++/Error.h>
 
+#include "messages/Metrics.h"
 #include "tarn/dbus/Bus.h"
 #include "tarn/mm/Follower.h"
-#include "tarn/mm/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
@@ -45,7 +45,7 @@ void ModemManagerSource::stop() {
 }
 
 std::optional<service::Metric> ModemManagerSource::query(std::uint32_t metricId) {
-  if (metricId != metric::kSimFiles) return std::nullopt;
+  if (metricId != messages::metric::KCellularSimCardFiles) return std::nullopt;
   std::lock_guard lock(mutex_);
   return simFiles_;
 }

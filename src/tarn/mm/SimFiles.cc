@@ -3,10 +3,10 @@
 #include <algorithm>
 #include <memory>
 
+#include "messages/Metrics.h"
 #include "messages/Records.h"
 #include "radio/Iccid.h"
 #include "radio/Imsi.h"
-#include "tarn/mm/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
@@ -47,7 +47,7 @@ std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs
   if (sim.imsi) add(kEfImsi, radio::encodeEfImsi(*sim.imsi));
   if (sim.serviceProvider) add(kEfSpn, encodeEfSpn(*sim.serviceProvider));
   if (record.efListsCount() == 0) return std::nullopt;
-  return service::Metric{metric::kSimFiles, record.data()};
+  return service::Metric{messages::metric::KCellularSimCardFiles, record.data()};
 }
 
 std::optional<service::Metric> mmCommonInfoMetric(const Sim& sim, std::uint64_t atMs) {
@@ -57,7 +57,7 @@ std::optional<service::Metric> mmCommonInfoMetric(const Sim& sim, std::uint64_t 
   messages::KCellularMmCommonInfo record;
   record.setTimestamp(atMs);
   record.setImsi(std::move(imsi));
-  return service::Metric{metric::kMmCommonInfo, record.data()};
+  return service::Metric{messages::metric::KCellularMmCommonInfo, record.data()};
 }
 
 }  // namespace tarn::mm

@@ -2,8 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include "messages/Metrics.h"
 #include "messages/Records.h"
-#include "tarn/sim/MetricIds.h"
 
 namespace tarn::mm {
 namespace {
@@ -26,7 +26,7 @@ TEST(SimFiles, HoldTheIdentitiesInTheFilesEncodingsAsAPhoneReadsThem) {
                 .serviceProvider = "Norvo"};
   const std::optional<service::Metric> metric = simFilesMetric(sim, 1500000000000);
   ASSERT_TRUE(metric);
-  EXPECT_EQ(metric->metricId, sim::metric_id::kSimFiles);
+  EXPECT_EQ(metric->metricId, messages::metric::KCellularSimCardFiles);
   const auto files = messages::KCellularSimCardFiles::initWithData(&metric->payload);
   ASSERT_TRUE(files);
   ASSERT_EQ(files->efListsCount(), 3u);

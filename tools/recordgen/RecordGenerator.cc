@@ -6,6 +6,7 @@
 #include <memory>
 #include <stdexcept>
 
+#include "FieldTable.h"
 #include "Naming.h"
 #include "RecordEmitter.h"
 
@@ -207,6 +208,7 @@ bool RecordGenerator::GenerateAll(const std::vector<const FileDescriptor*>& file
   }
   try {
     writeRegistry(schemas, *context);
+    writeFieldTable(schemas, *context);
     return true;
   } catch (const std::exception& failure) {
     *error = failure.what();

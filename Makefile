@@ -8,13 +8,14 @@ CMAKE_ARGS ?=
 
 configure = test -f $(1)/build.ninja || cmake -S . -B $(1) -G Ninja $(2) $(CMAKE_ARGS)
 
-.PHONY: all deps build build-asan test unit-test asan-test fuzz-smoke bench run format clean
+.PHONY: all deps build build-asan test unit-test asan-test fuzz-smoke bench run format format-check tidy clean
 
 all: build
 
 deps:
 	@tools/install-deps.sh
 	@test -d tests/browser/node_modules || (cd tests/browser && npm ci --no-audit --no-fund)
+	@test -d src/ui/web/vendor/node_modules || (cd src/ui/web/vendor && npm ci --no-audit --no-fund)
 
 build: deps
 	@$(call configure,$(BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo)
@@ -45,6 +46,13 @@ run: build
 
 format:
 	git ls-files '*.h' '*.cc' | xargs clang-format -i
+
+format-check:
+	git ls-files '*.h' '*.cc' | xargs clang-format --dry-run -Werror
+
+# clang-tidy with the checks of .clang-tidy over every source of ours (not the generated ones).
+tidy: build
+	run-clang-tidy -quiet -p $(BUILD) '$(CURDIR)/(src|tools|tests|bench|fuzz)/.*\.cc$$'
 
 clean:
 	rm -rf $(BUILD) $(ASAN_BUILD)

@@ -99,9 +99,8 @@ struct Pipeline {
   using Reach = std::function<std::shared_ptr<tarn::client::Transport>(
       std::shared_ptr<tarn::service::Core> core)>;
 
-  explicit Pipeline(const Reach& reach) {
-    tarn::client::useTransport(reach(core));
-    wrapper = std::make_unique<TarnWrapper>();
+  explicit Pipeline(const Reach& reach) : transport(reach(core)) {
+    wrapper = std::make_unique<TarnWrapper>(*transport);
     wrapper->addVelaConfigForAppId("vexmora", NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig");
     wrapper->listen();
     wrapper->setDelegate(delegate);
@@ -119,6 +118,7 @@ struct Pipeline {
   std::shared_ptr<BenchmarkSource> source = std::make_shared<BenchmarkSource>();
   std::shared_ptr<tarn::service::Core> core = std::make_shared<tarn::service::Core>(source);
   std::shared_ptr<CountingDelegate> delegate = std::make_shared<CountingDelegate>(log);
+  std::shared_ptr<tarn::client::Transport> transport;
   std::unique_ptr<TarnWrapper> wrapper;
 };
 

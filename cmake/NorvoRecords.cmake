@@ -5,7 +5,7 @@
 function(norvo_add_record_library target)
   cmake_parse_arguments(ARG "" "" "PROTOS;SOURCES;LIBS" ${ARGN})
   set(out ${CMAKE_BINARY_DIR}/generated/messages)
-  set(outputs ${out}/Records.h ${out}/Records.cc ${out}/RecordFields.cc)
+  set(outputs ${out}/Records.h ${out}/Records.cc ${out}/RecordFields.cc ${out}/Metrics.h)
   set(sources ${out}/Records.cc ${out}/RecordFields.cc)
   foreach(proto ${ARG_PROTOS})
     get_filename_component(stem ${proto} NAME_WE)

@@ -4,7 +4,7 @@
 set -euo pipefail
 
 packages=(
-  build-essential cmake ninja-build pkg-config clang-format
+  build-essential cmake ninja-build pkg-config clang-format lld
   protobuf-compiler libprotobuf-dev libprotoc-dev
   libboost1.81-dev libboost-json1.81-dev
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev

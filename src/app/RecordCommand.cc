@@ -97,10 +97,11 @@ bool runRecordingSession(const RecordingRun& run, const std::string& configurati
   {
     TarnWrapper session;
     session.setDelegate(receiver);
-    subscribed = session.addVelaConfigForAppId("vexmora", configurationPath);
+    subscribed = session.addVelaConfigForAppId(TarnWrapper::kAppName, configurationPath);
     if (subscribed) {
       session.listen();
-      session.querySpecificMetric("vexmora", RootNavigationController::kSimQueryTriggerRef, 0,
+      session.querySpecificMetric(TarnWrapper::kAppName,
+                                  RootNavigationController::kSimQueryTriggerRef, 0,
                                   RootNavigationController::kSimQueryTriggerID, 0, 0);
 
       boost::asio::steady_timer timer(platform::mainQueue());

@@ -33,6 +33,5 @@ void RootNavigationController::viewDidLoad() {
   platform::log::plain("Querying SIM files");
   // Always the service's name for this app, whatever myAppID holds.
   if (myTarnWrapper_ != nullptr)
-    myTarnWrapper_->querySpecificMetric("vexmora", kSimQueryTriggerRef, 0, kSimQueryTriggerID, 0,
-                                        0);
+    myTarnWrapper_->querySpecificMetric(myAppID_, kSimQueryTriggerRef, 0, kSimQueryTriggerID, 0, 0);
 }

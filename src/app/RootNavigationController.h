@@ -34,7 +34,7 @@ class RootNavigationController : public ui::NavigationController {
   void viewDidLoad() override;
 
  private:
-  const std::string myAppID_ = "vexmora";
+  const std::string myAppID_{TarnWrapper::kAppName};
   const std::string metricFileName_ = "fen_test_lte";
   const std::string metricFileType_ = "deviceconfig";
   TarnWrapper* const myTarnWrapper_;

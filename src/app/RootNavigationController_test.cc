@@ -59,15 +59,6 @@ class RecordingTransport final : public tarn::client::Transport {
 
 class TheRootNavigationController : public ::testing::Test {
  protected:
-  ~TheRootNavigationController() override { tarn::client::useTransport(nullptr); }
-
-  // The session below must open its connection through the recording transport.
-  static std::shared_ptr<RecordingTransport> installed() {
-    auto transport = std::make_shared<RecordingTransport>();
-    tarn::client::useTransport(transport);
-    return transport;
-  }
-
   // Builds the controller over `resources` and loads its view; answers the plain log lines.
   std::vector<std::string> start(const ui::Bundle& resources) {
     RootNavigationController root(std::make_unique<NorvoViewController>(), &session, validator,
@@ -77,8 +68,8 @@ class TheRootNavigationController : public ::testing::Test {
     return log.plainLines();
   }
 
-  std::shared_ptr<RecordingTransport> transport = installed();
-  TarnWrapper session;
+  std::shared_ptr<RecordingTransport> transport = std::make_shared<RecordingTransport>();
+  TarnWrapper session{*transport};
   store::MetricValidator validator{&session};
   const ui::Bundle shipped{{NORVO_RESOURCES_DIR}};
   const ui::Bundle empty{{std::filesystem::temp_directory_path() / "norvo-no-resources"}};

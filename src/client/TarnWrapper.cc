@@ -13,13 +13,9 @@ namespace {
 
 using tarn::ipc::Object;
 
-constexpr std::string_view kClientName = "vexmora";
-constexpr std::string_view kAppIdText = "vexmora";
 constexpr std::int64_t kAppId = 2;
 constexpr std::int64_t kPayloadType = 0;
 constexpr const char* kQueueLabel = "org.norvo.viewer.serialQ.queue";
-// What a command result holds before the library has answered.
-constexpr std::int32_t kNotPerformed = static_cast<std::int32_t>(0xE020E002);
 
 constexpr const char* kAddName = "-[TarnWrapper addVelaConfigForAppId:andProtofFilePath:]";
 constexpr const char* kRemoveName = "-[TarnWrapper removeVelaConfigForAppid:]";
@@ -58,7 +54,12 @@ TarnWrapper& TarnWrapper::sharedInstance() {
 }
 
 TarnWrapper::TarnWrapper() : delegate_(std::make_shared<DelegateSlot>()) {
-  tarnManager_ = tarn::client::CreateManager(std::string(kClientName), queue());
+  tarnManager_ = tarn::client::CreateManager(std::string(kAppName), queue());
+}
+
+TarnWrapper::TarnWrapper(tarn::client::Transport& transport)
+    : delegate_(std::make_shared<DelegateSlot>()) {
+  tarnManager_ = tarn::client::CreateManager(std::string(kAppName), queue(), transport);
 }
 
 TarnWrapper::~TarnWrapper() {
@@ -75,7 +76,7 @@ platform::SerialQueue TarnWrapper::queue() {
 }
 
 bool TarnWrapper::addVelaConfigForAppId(std::string_view appId, std::string_view path) {
-  if (appId != kAppIdText) return false;
+  if (appId != kAppName) return false;
   Object payload = Object::bytes(readWholeFile(path));
   if (payload.isNull()) return false;
   return perform(kAddName, tarn::kCommandAddConfiguration,
@@ -85,7 +86,7 @@ bool TarnWrapper::addVelaConfigForAppId(std::string_view appId, std::string_view
 }
 
 bool TarnWrapper::removeVelaConfigForAppid(std::string_view appId) {
-  if (appId != kAppIdText) return false;
+  if (appId != kAppName) return false;
   return perform(kRemoveName, tarn::kCommandClearConfiguration,
                  {entry(tarn::kKeyAppID, Object::integer(kAppId))});
 }
@@ -93,7 +94,7 @@ bool TarnWrapper::removeVelaConfigForAppid(std::string_view appId) {
 bool TarnWrapper::querySpecificMetric(std::string_view appId, std::int32_t triggerRef,
                                       std::int32_t triggerType, std::int32_t triggerID,
                                       std::int32_t profileID, std::int32_t metricID) {
-  if (appId != kAppIdText) return false;
+  if (appId != kAppName) return false;
   return perform(kQueryName, tarn::kCommandQueryMetric,
                  {entry(tarn::kKeyAppID, Object::integer(kAppId)),
                   entry(tarn::kKeyPayloadType, Object::integer(kPayloadType)),
@@ -105,10 +106,10 @@ bool TarnWrapper::querySpecificMetric(std::string_view appId, std::int32_t trigg
 }
 
 bool TarnWrapper::perform(const char* logName, std::string_view command, Object::Entries entries) {
-  tarn::client::CommandResult result{kNotPerformed, {}};
   const Object input = Object::dictionary(std::move(entries));
   Object output;
-  result = tarn::client::PerformCommand(tarnManager_, std::string(command), input, output);
+  const tarn::client::CommandResult result =
+      tarn::client::PerformCommand(tarnManager_, std::string(command), input, output);
   platform::log::systemf("%s: error=%d msg=%s", logName, result.status, result.message);
   return result.status == 0;
 }

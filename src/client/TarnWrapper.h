@@ -10,6 +10,7 @@
 #include "platform/SerialQueue.h"
 #include "tarn/Ipc.h"
 #include "tarn/client/Client.h"
+#include "tarn/client/Transport.h"
 
 // The app's one session with the baseband manager service. It sends the configuration and query
 // commands and hands each delivered event and metric to its delegate on the main queue.
@@ -18,11 +19,16 @@
 // the wrapper's serial queue.
 class TarnWrapper {
  public:
+  // The app's name: the client name of its session and the app ID text of its commands.
+  static constexpr std::string_view kAppName = "vexmora";
+
   // Created on first use and never released.
   static TarnWrapper& sharedInstance();
 
-  // Opens a session under the client name "vexmora"; no delegate yet, and no events until listen().
+  // Opens a session under the client name "vexmora" over the application's transport (or over
+  // `transport`); no delegate yet, and no events until listen().
   TarnWrapper();
+  explicit TarnWrapper(tarn::client::Transport& transport);
   ~TarnWrapper();
   TarnWrapper(const TarnWrapper&) = delete;
   TarnWrapper& operator=(const TarnWrapper&) = delete;

@@ -122,10 +122,7 @@ void drain(const platform::SerialQueue& queue) {
 
 class ATarnWrapper : public ::testing::Test {
  protected:
-  ATarnWrapper() {
-    tarn::client::useTransport(transport);
-    wrapper = std::make_unique<TarnWrapper>();
-  }
+  ATarnWrapper() { wrapper = std::make_unique<TarnWrapper>(*transport); }
 
   // Pushes the shipped configuration and listens, with `delegate` set.
   void startListening() {
@@ -201,12 +198,10 @@ TEST_F(ATarnWrapper, SendsEachCommandWithItsEntriesInOrderAndLogsItsResult) {
 }
 
 TEST_F(ATarnWrapper, AnswersByTheStatusAloneAndLogsItSigned) {
-  tarn::client::useTransport(
-      std::make_shared<RecordingTransport>(std::optional(tarn::CommandResult{0, "late"})));
-  TarnWrapper accepting;
-  tarn::client::useTransport(
-      std::make_shared<RecordingTransport>(std::optional(tarn::CommandResult{-5, ""})));
-  TarnWrapper refusing;
+  RecordingTransport late(std::optional(tarn::CommandResult{0, "late"}));
+  TarnWrapper accepting(late);
+  RecordingTransport refused(std::optional(tarn::CommandResult{-5, ""}));
+  TarnWrapper refusing(refused);
 
   EXPECT_TRUE(accepting.removeVelaConfigForAppid("vexmora"));
   EXPECT_FALSE(refusing.removeVelaConfigForAppid("vexmora"));
@@ -282,13 +277,11 @@ TEST_F(ATarnWrapper, CallsNoDelegateThatWentAwayBeforeTheMainQueueRan) {
 }
 
 TEST_F(ATarnWrapper, KeepsWorkingWhenItsSessionIsMissingOrItsServiceHasGone) {
-  tarn::client::useTransport(
-      std::make_shared<RecordingTransport>(std::optional<tarn::CommandResult>()));
-  TarnWrapper unconnected;
+  RecordingTransport unreachable{std::optional<tarn::CommandResult>()};
+  TarnWrapper unconnected(unreachable);
   EXPECT_FALSE(unconnected.removeVelaConfigForAppid("vexmora"));
   unconnected.listen();
 
-  tarn::client::useTransport(nullptr);
   transport.reset();
   core.reset();
   EXPECT_FALSE(wrapper->removeVelaConfigForAppid("vexmora"));
@@ -303,7 +296,8 @@ TEST_F(ATarnWrapper, KeepsWorkingWhenItsSessionIsMissingOrItsServiceHasGone) {
 }
 
 TEST(TheSharedTarnWrapper, PushesTheShippedConfigurationAndDeliversMetricsAndTheSimFiles) {
-  // The shared wrapper keeps its session for the rest of the process, so its service stays too.
+  // The shared wrapper opens its session over the transport the application chose, and keeps it
+  // for the rest of the process, so its service stays too.
   static const auto source = std::make_shared<tarn::testing::ScriptedMetricSource>();
   static const auto core = std::make_shared<tarn::service::Core>(source);
   tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(core));

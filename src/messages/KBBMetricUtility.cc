@@ -1,45 +1,29 @@
 #include "messages/KBBMetricUtility.h"
 
+#include <algorithm>
+
+#include "messages/Metrics.h"
 #include "platform/Log.h"
 
 namespace messages {
 namespace {
 
-// Names as the baseband stores them: two name no record class, and the GSM
-// and SIM names begin with a lower-case "k".
-constexpr std::array<KBBMetricUtility::Entry, 31> kMetricIds{{
-    {19972, "KCellularLteRrcState"},
-    {19992, "KCellularLteCdrxConfig"},
-    {20005, "KCellularLteRadioLinkFailure"},
-    {16578, "KCellularLteScellInfo"},
-    {54030, "KCellularLteSelReselCellInfo"},
-    {54017, "KCellularLteServingCellMeasurement"},
-    {54018, "KCellularLteTxPower"},
-    {20330, "KCellularRsrpRsrqSinr"},
-    {54540, "KCellularEmmContext"},
-    {54027, "KCellularLteComponentCarrierInfo"},
-    {54035, "KCellularLteCarrierAggregationStatus"},
-    {54032, "KCellularLteNbrInterRatCellMeas"},
-    {54031, "KCellularLteNbrEutraCellMeas"},
-    {54537, "KCellularMmCommonInfo"},
-    {54541, "KCellularActivatedBearerContexts"},
-    {53522, "KCellularWcdmaRrcConnectionState"},
-    {12300, "KCellularWcdmaCellInfo"},
-    {53506, "KCellularWcdmaScellMeasurement"},
-    {53507, "KCellularWcdmaTxPower"},
-    {53509, "KCellularWcdmaNbrCellMeas"},
-    {53508, "KCellularWcdmaSelReselCellInfo"},
-    {53523, "KCellularWcdmaRrcConfiguration"},
-    {54538, "KCellularMmContext"},
-    {54539, "KCellularGmmContext"},
-    {11788, "kCellularGsmScellInfo"},
-    {53249, "kCellularGsmIdleConfig"},
-    {53250, "kCellularGsmIdleScellMeasurement"},
-    {53251, "kCellularGsmCsRfMeasurement"},
-    {53257, "kCellularGsmGrrEventMeasCr"},
-    {53260, "kCellularGsmGprsConfig"},
-    {19, "kCellularSimCardFiles"},
-}};
+// The metrics whose tags are metric-ID tags, named as the baseband's table names them: two
+// name no record class, and the GSM and SIM names begin with a lower-case "k".
+static_assert(std::ranges::count_if(kMetricKinds, &MetricKind::tagListed) == 31,
+              "the baseband's table holds 31 metric-ID tags");
+
+constexpr std::array<KBBMetricUtility::Entry, 31> tagTable() {
+  std::array<KBBMetricUtility::Entry, 31> table{};
+  auto next = table.begin();
+  for (const MetricKind& metric : kMetricKinds) {
+    if (metric.tagListed)
+      *next++ = {static_cast<std::uint16_t>(metric.metricID & 0xFFFF), metric.name};
+  }
+  return table;
+}
+
+constexpr std::array<KBBMetricUtility::Entry, 31> kMetricIds = tagTable();
 
 // The table as one bit per 16-bit tag (8 KiB), built at compile time, so the
 // per-field test is a single load and never races.

@@ -5,6 +5,7 @@
 
 #include "codec/Writer.h"
 #include "messages/KBBMetricUtility.h"
+#include "messages/Metrics.h"
 #include "platform/Log.h"
 
 namespace messages {
@@ -329,14 +330,31 @@ TEST(ARecord, DescribesItselfByClassIdentityAndDictionary) {
   EXPECT_NE(text.find("> [\"mmec\": 3]"), std::string::npos) << text;
 }
 
-TEST(TheRecordClasses, NumberFiftySixAndMatchTheMetricIdTable) {
+TEST(TheRecordClasses, NumberFiftySixAndMatchTheMetricTable) {
   EXPECT_EQ(recordClasses().size(), 56u);
   int withoutRule = 0;
   for (const auto& recordClass : recordClasses())
     withoutRule += recordClass.appliesMetricIdTagRule ? 0 : 1;
   EXPECT_EQ(withoutRule, 2);
-  // Table names that differ from class names only in the case of the leading "k" still name a
-  // class.
+  int withRecord = 0;
+  for (const MetricKind& kind : kMetricKinds) {
+    if (kind.recordClass.empty()) continue;
+    ++withRecord;
+    EXPECT_NE(recordClassNamed(kind.recordClass), nullptr) << kind.name;
+  }
+  EXPECT_EQ(withRecord, 31) << "every metric but the radio link failure";
+}
+
+TEST(TheMetricIdTagTable, IsTheSchemasTaggedMetricsWithTheBasebandsNames) {
+  std::vector<std::pair<std::uint16_t, std::string_view>> tagged;
+  for (const MetricKind& kind : kMetricKinds) {
+    if (kind.tagListed) tagged.emplace_back(kind.metricID & 0xFFFF, kind.name);
+  }
+  std::vector<std::pair<std::uint16_t, std::string_view>> table;
+  for (const auto& entry : KBBMetricUtility::metricIdTable())
+    table.emplace_back(entry.metricId, entry.messageName);
+  EXPECT_EQ(table, tagged);
+  // Names that differ from class names only in the case of the leading "k" still name a class.
   int named = 0;
   for (const auto& entry : KBBMetricUtility::metricIdTable()) {
     std::string name(entry.messageName);

@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <limits>
 
+#include "tarn/sim/Units.h"
+
 namespace store {
 namespace {
 
@@ -21,6 +23,34 @@ std::optional<std::string> tagged(double milliseconds) {
 Dictionary converted(Dictionary dictionary, EntryConversion conversion) {
   convertEntry(dictionary, conversion, tagged);
   return dictionary;
+}
+
+// The value the intake shows for a level the simulator encoded.
+double shown(std::int64_t encoded, EntryRule rule) {
+  const Dictionary level = converted({{"level", encoded}}, {"level", rule});
+  return level.find("level")->asDouble().value_or(0.0);
+}
+
+TEST(EntryRules, ShowTheLevelsTheSimulatorEncodesWithinHalfAStep) {
+  namespace units = tarn::sim::units;
+  struct Range {
+    EntryRule rule;
+    std::uint32_t (*encode)(double);
+    double low, high, tolerance;
+  };
+  const Range ranges[] = {
+      {EntryRule::RsrpIndex, units::rsrpIndex, -139.0, -44.0, 0.5},
+      {EntryRule::RsrqIndex, units::rsrqIndex, -19.5, -3.0, 0.25},
+      {EntryRule::RscpIndex, units::rscpIndex, -116.0, -25.0, 0.5},
+      {EntryRule::EcNoIndex, units::ecnoIndex, -24.5, 0.0, 0.25},
+      {EntryRule::RxLevIndex, units::rxlevIndex, -110.0, -47.0, 0.5},
+  };
+  for (const Range& range : ranges) {
+    for (double level = range.low; level <= range.high; level += 0.1)
+      EXPECT_NEAR(shown(range.encode(level), range.rule), level, range.tolerance) << level;
+  }
+  EXPECT_NEAR(shown(units::centiDb(-98.504), EntryRule::CentiDbFloat), -98.5, 0.005);
+  EXPECT_NEAR(shown(units::halfDb(12.4), EntryRule::SinrHalfDb), 12.5, 0.25);
 }
 
 TEST(EntryRules, LeaveEntriesOfAnotherTypeAsTheyAre) {

@@ -1,6 +1,5 @@
 #include "messages/Records.h"
 #include "store/Conversions.h"
-#include "store/MetricValidator.h"
 
 // The six GSM handlers, the five NAS handlers (mobility management contexts, common information
 // and active bearers) and the SIM file handler.
@@ -49,34 +48,33 @@ constexpr HandlerStep kSimFileSteps[] = {
              &displayDictionary},
 };
 
-using V = MetricValidator;
 using D = DisplayDictionary;
 
 constexpr Handler kHandlers[] = {
-    {V::K_GSM_SCELL_INFO, &decodeDisplayDictionary<KCellularGsmScellInfo>, D::GSMScellInfo,
-     "Received GSM Serving Cell Info ", kTimestampThenLog},
-    {V::K_GSM_IDLE_CONFIG, &decodeDisplayDictionary<KCellularGsmIdleConfig>, D::GSMIdleConfigInfo,
-     "Received GSM Idle Config Info is ", kTimestampThenLog},
-    {V::K_GSM_IDLE_SCELL_MEAS, &decodeDisplayDictionary<KCellularGsmIdleScellMeasurement>,
-     D::GSMIdleScellMeas, "Received GSM Idle Serving Cell Meas Info is ", kTimestampThenLog},
-    {V::K_GSM_CS_RF_MEAS, &decodeDisplayDictionary<KCellularGsmCsRfMeasurement>, D::GSMConnRfMeas,
-     "Received GSM Connected Serving Cell Meas Info is ", kTimestampThenLog},
-    {V::K_GSM_NCELL_MEAS, &decodeDisplayDictionary<KCellularGsmGrrEventMeasCr>, D::GSMNbrMeas,
-     "Received GSM Nbr Cell Meas Info is ", kNeighbourSteps},
-    {V::K_GSM_GPRS_CONFIG, &decodeDisplayDictionary<KCellularGsmGprsConfig>, D::GSMGPRSConfig,
-     "Received GSM GPRS Config Info is ", kTimestampThenLog},
-    {V::K_CELLULAR_MM_INFO, &decodeDisplayDictionary<KCellularMmCommonInfo>,
-     D::CellularMMCommonInfo, "Received MM Common Info Dict is : ", kTimestampThenLog},
-    {V::K_CELLULAR_MM_CTXT, &decodeDisplayDictionary<KCellularMmContext>, D::MMContext,
-     "Received MM Context Info is ", kTimestampThenLog},
-    {V::K_CELLULAR_GMM_CTXT, &decodeDisplayDictionary<KCellularGmmContext>, D::GMMContext,
-     "Received GMM Context Info is ", kTimestampThenLog},
-    {V::K_LTE_EMM_CTXT, &decodeDisplayDictionary<KCellularEmmContext>, D::LTEEMMContext,
-     "Received EMM Context is ", kEmmContextSteps},
-    {V::K_CELLULAR_ACTIVE_BEARER, &decodeDisplayDictionary<KCellularActivatedBearerContexts>,
-     D::CellularActiveBearer, "Received Bearer Context Info is ", kActiveBearerSteps},
-    {V::K_SIM_FILE_INFO, &decodeDisplayDictionary<KCellularSimCardFiles>, D::SIMFileInfo,
-     "Received SIM Card File Info is ", kSimFileSteps},
+    recordHandler<KCellularGsmScellInfo>(D::GSMScellInfo, "Received GSM Serving Cell Info ",
+                                         kTimestampThenLog),
+    recordHandler<KCellularGsmIdleConfig>(D::GSMIdleConfigInfo, "Received GSM Idle Config Info is ",
+                                          kTimestampThenLog),
+    recordHandler<KCellularGsmIdleScellMeasurement>(
+        D::GSMIdleScellMeas, "Received GSM Idle Serving Cell Meas Info is ", kTimestampThenLog),
+    recordHandler<KCellularGsmCsRfMeasurement>(
+        D::GSMConnRfMeas, "Received GSM Connected Serving Cell Meas Info is ", kTimestampThenLog),
+    recordHandler<KCellularGsmGrrEventMeasCr>(D::GSMNbrMeas, "Received GSM Nbr Cell Meas Info is ",
+                                              kNeighbourSteps),
+    recordHandler<KCellularGsmGprsConfig>(D::GSMGPRSConfig, "Received GSM GPRS Config Info is ",
+                                          kTimestampThenLog),
+    recordHandler<KCellularMmCommonInfo>(D::CellularMMCommonInfo,
+                                         "Received MM Common Info Dict is : ", kTimestampThenLog),
+    recordHandler<KCellularMmContext>(D::MMContext, "Received MM Context Info is ",
+                                      kTimestampThenLog),
+    recordHandler<KCellularGmmContext>(D::GMMContext, "Received GMM Context Info is ",
+                                       kTimestampThenLog),
+    recordHandler<KCellularEmmContext>(D::LTEEMMContext, "Received EMM Context is ",
+                                       kEmmContextSteps),
+    recordHandler<KCellularActivatedBearerContexts>(
+        D::CellularActiveBearer, "Received Bearer Context Info is ", kActiveBearerSteps),
+    recordHandler<KCellularSimCardFiles>(D::SIMFileInfo, "Received SIM Card File Info is ",
+                                         kSimFileSteps),
 };
 
 }  // namespace

@@ -6,6 +6,7 @@
 #include <string_view>
 #include <variant>
 
+#include "messages/Metrics.h"
 #include "platform/Log.h"
 #include "platform/Value.h"
 #include "store/DisplayStore.h"
@@ -75,6 +76,14 @@ std::optional<platform::Dictionary> decodeDisplayDictionary(const platform::Byte
                         payload == nullptr ? std::size_t{0} : payload->size(),
                         Record().className());
   return std::nullopt;
+}
+
+// The handler of the metric that carries `Record`: its ID comes from the schemas.
+template <class Record>
+constexpr Handler recordHandler(DisplayDictionary display, std::string_view logPrefix,
+                                std::span<const HandlerStep> steps) {
+  return {messages::MetricOf<Record>::id, &decodeDisplayDictionary<Record>, display, logPrefix,
+          steps};
 }
 
 // A field of one of the store's records, e.g. storeField<&DisplayStore::myLTE, &LTE::TxPower>.

@@ -1,6 +1,5 @@
 #include "messages/Records.h"
 #include "store/Conversions.h"
-#include "store/MetricValidator.h"
 
 // The eleven LTE handlers. Carrier levels arrive in hundredths of a dB, neighbour levels as
 // measurement indexes, SINR in half dB and bandwidths as codes; each list element also gets the
@@ -86,32 +85,30 @@ constexpr HandlerStep kInterRatSteps[] = {
              &displayDictionary, kTimestampKey, kGeranNeighbourLevels},
 };
 
-using V = MetricValidator;
 using D = DisplayDictionary;
 
 constexpr Handler kHandlers[] = {
-    {V::K_LTE_RRC_STATE, &decodeDisplayDictionary<KCellularLteRrcState>, D::LTERRCState,
-     "Current RRC state is ", kTimestampThenLog},
-    {V::K_LTE_CDRX_CONFIG, &decodeDisplayDictionary<KCellularLteCdrxConfig>, D::LTECDRXConfig,
-     "Current CDRX Config is ", kTimestampThenLog},
-    {V::K_LTE_SCELL_INFO, &decodeDisplayDictionary<KCellularLteScellInfo>, D::LTESCellInfo,
-     "Current Serving Cell Info is ", kServingCellSteps},
-    {V::K_LTE_SEL_RESEL_INFO, &decodeDisplayDictionary<KCellularLteSelReselCellInfo>,
-     D::LTESelResel, "Received LTE Cell Resel Info is ", kReselectionSteps},
-    {V::K_LTE_RSRP_RSRQ_SINR, &decodeDisplayDictionary<KCellularLteRsrpRsrqSinr>,
-     D::LTERsrpRsrqSinr, "Received RSRP RSRQ SINR is : ", kRsrpRsrqSinrSteps},
-    {V::K_LTE_TX_POWER, &decodeDisplayDictionary<KCellularLteTxPower>, D::LTETxPower,
-     "Received LTE Tx Power is ", kTxPowerSteps},
-    {V::K_LTE_COMPCARR_INFO, &decodeDisplayDictionary<KCellularLteComponentCarrierInfo>,
-     D::LTECompCarr, "Received Component Carrier info is ", kTimestampThenLog},
-    {V::K_LTE_CA_STATUS, &decodeDisplayDictionary<KCellularLteCarrierAggregationStatus>,
-     D::LTECAStatus, "Received CA Status Dict is ", kCarrierAggregationSteps},
-    {V::K_LTE_SECONDARYCELL_MEAS, &decodeDisplayDictionary<KCellularLteSecondaryCellMeasurements>,
-     D::LTESecondaryCellMeas, "Received Secondary Cell Measurement Dict is ", kSecondaryCellSteps},
-    {V::K_LTE_INTRARAT_MEAS, &decodeDisplayDictionary<KCellularLteNbrEutraCellMeas>,
-     D::LTEIntraRatMeas, "Received LTE IRAT Meas is ", kIntraRatSteps},
-    {V::K_LTE_INTERRAT_MEAS, &decodeDisplayDictionary<KCellularLteNbrInterRatCellMeas>,
-     D::LTEInterRatMeas, "Received LTE InterRat Meas Info is ", kInterRatSteps},
+    recordHandler<KCellularLteRrcState>(D::LTERRCState, "Current RRC state is ", kTimestampThenLog),
+    recordHandler<KCellularLteCdrxConfig>(D::LTECDRXConfig, "Current CDRX Config is ",
+                                          kTimestampThenLog),
+    recordHandler<KCellularLteScellInfo>(D::LTESCellInfo, "Current Serving Cell Info is ",
+                                         kServingCellSteps),
+    recordHandler<KCellularLteSelReselCellInfo>(D::LTESelResel, "Received LTE Cell Resel Info is ",
+                                                kReselectionSteps),
+    recordHandler<KCellularLteRsrpRsrqSinr>(D::LTERsrpRsrqSinr,
+                                            "Received RSRP RSRQ SINR is : ", kRsrpRsrqSinrSteps),
+    recordHandler<KCellularLteTxPower>(D::LTETxPower, "Received LTE Tx Power is ", kTxPowerSteps),
+    recordHandler<KCellularLteComponentCarrierInfo>(
+        D::LTECompCarr, "Received Component Carrier info is ", kTimestampThenLog),
+    recordHandler<KCellularLteCarrierAggregationStatus>(
+        D::LTECAStatus, "Received CA Status Dict is ", kCarrierAggregationSteps),
+    recordHandler<KCellularLteSecondaryCellMeasurements>(
+        D::LTESecondaryCellMeas, "Received Secondary Cell Measurement Dict is ",
+        kSecondaryCellSteps),
+    recordHandler<KCellularLteNbrEutraCellMeas>(D::LTEIntraRatMeas, "Received LTE IRAT Meas is ",
+                                                kIntraRatSteps),
+    recordHandler<KCellularLteNbrInterRatCellMeas>(
+        D::LTEInterRatMeas, "Received LTE InterRat Meas Info is ", kInterRatSteps),
 };
 
 }  // namespace

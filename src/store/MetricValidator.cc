@@ -60,8 +60,13 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     return false;
   }
   const platform::Value* payload = metric.find(payloadKey);
-  return runHandler(*handler, payload != nullptr ? payload->asBytes() : nullptr, store_,
-                    [this](double milliseconds) { return formatTimestamp(milliseconds); });
+  if (!runHandler(*handler, payload != nullptr ? payload->asBytes() : nullptr, store_,
+                  [this](double milliseconds) { return formatTimestamp(milliseconds); })) {
+    return false;
+  }
+  for (const StoreObserver& observer : storeObservers_)
+    observer(handler->display, *this);
+  return true;
 }
 
 std::optional<std::string> MetricValidator::formatTimestamp(double milliseconds) const {

@@ -1,12 +1,15 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "client/TarnWrapperDelegate.h"
+#include "messages/Metrics.h"
 #include "platform/Value.h"
 #include "store/DisplayDictionaries.h"
 #include "store/DisplayStore.h"
@@ -22,39 +25,52 @@ namespace store {
 // lock.
 class MetricValidator : public TarnWrapperDelegate {
  public:
-  // Metric IDs: 0x3C in bits 16 to 23, the metric's tag in the low 16 bits.
-  static constexpr std::int64_t K_LTE_CDRX_CONFIG = 0x3C4E18;
-  static constexpr std::int64_t K_LTE_RRC_STATE = 0x3C4E04;
-  static constexpr std::int64_t K_LTE_SCELL_INFO = 0x3C40C2;
-  static constexpr std::int64_t K_LTE_RLF = 0x3C4E25;
-  static constexpr std::int64_t K_LTE_SEL_RESEL_INFO = 0x3CD30E;
-  static constexpr std::int64_t K_LTE_SCELL_MEAS = 0x3CD301;
-  static constexpr std::int64_t K_LTE_TX_POWER = 0x3CD302;
-  static constexpr std::int64_t K_LTE_RSRP_RSRQ_SINR = 0x3C4F6A;
-  static constexpr std::int64_t K_LTE_COMPCARR_INFO = 0x3CD30B;
-  static constexpr std::int64_t K_LTE_CA_STATUS = 0x3CD313;
-  static constexpr std::int64_t K_LTE_INTERRAT_MEAS = 0x3CD310;
-  static constexpr std::int64_t K_LTE_INTRARAT_MEAS = 0x3CD30F;
-  static constexpr std::int64_t K_LTE_SECONDARYCELL_MEAS = 0x3CD317;
-  static constexpr std::int64_t K_CELLULAR_MM_INFO = 0x3CD509;
-  static constexpr std::int64_t K_CELLULAR_ACTIVE_BEARER = 0x3CD50D;
-  static constexpr std::int64_t K_LTE_EMM_CTXT = 0x3CD50C;
-  static constexpr std::int64_t K_CELLULAR_MM_CTXT = 0x3CD50A;
-  static constexpr std::int64_t K_CELLULAR_GMM_CTXT = 0x3CD50B;
-  static constexpr std::int64_t K_UMTS_RRC_STATE = 0x3CD112;
-  static constexpr std::int64_t K_UMTS_RRC_CONFIG = 0x3CD113;
-  static constexpr std::int64_t K_UMTS_SCELL_INFO = 0x3C300C;
-  static constexpr std::int64_t K_UMTS_SCELL_MEAS = 0x3CD102;
-  static constexpr std::int64_t K_UMTS_TX_POWER = 0x3CD103;
-  static constexpr std::int64_t K_UMTS_SEL_RESEL_INFO = 0x3CD104;
-  static constexpr std::int64_t K_UMTS_NCELL_MEAS = 0x3CD105;
-  static constexpr std::int64_t K_GSM_SCELL_INFO = 0x3C2E0C;
-  static constexpr std::int64_t K_GSM_IDLE_CONFIG = 0x3CD001;
-  static constexpr std::int64_t K_GSM_IDLE_SCELL_MEAS = 0x3CD002;
-  static constexpr std::int64_t K_GSM_CS_RF_MEAS = 0x3CD003;
-  static constexpr std::int64_t K_GSM_NCELL_MEAS = 0x3CD009;
-  static constexpr std::int64_t K_GSM_GPRS_CONFIG = 0x3CD00C;
-  static constexpr std::int64_t K_SIM_FILE_INFO = 0x3C0013;
+  // Metric IDs, as the schemas declare them.
+  static constexpr std::int64_t K_LTE_CDRX_CONFIG = messages::metric::KCellularLteCdrxConfig;
+  static constexpr std::int64_t K_LTE_RRC_STATE = messages::metric::KCellularLteRrcState;
+  static constexpr std::int64_t K_LTE_SCELL_INFO = messages::metric::KCellularLteScellInfo;
+  static constexpr std::int64_t K_LTE_RLF = messages::metric::KCellularLteRadioLinkFailure;
+  static constexpr std::int64_t K_LTE_SEL_RESEL_INFO =
+      messages::metric::KCellularLteSelReselCellInfo;
+  static constexpr std::int64_t K_LTE_SCELL_MEAS =
+      messages::metric::KCellularLteServingCellMeasurement;
+  static constexpr std::int64_t K_LTE_TX_POWER = messages::metric::KCellularLteTxPower;
+  static constexpr std::int64_t K_LTE_RSRP_RSRQ_SINR = messages::metric::KCellularLteRsrpRsrqSinr;
+  static constexpr std::int64_t K_LTE_COMPCARR_INFO =
+      messages::metric::KCellularLteComponentCarrierInfo;
+  static constexpr std::int64_t K_LTE_CA_STATUS =
+      messages::metric::KCellularLteCarrierAggregationStatus;
+  static constexpr std::int64_t K_LTE_INTERRAT_MEAS =
+      messages::metric::KCellularLteNbrInterRatCellMeas;
+  static constexpr std::int64_t K_LTE_INTRARAT_MEAS =
+      messages::metric::KCellularLteNbrEutraCellMeas;
+  static constexpr std::int64_t K_LTE_SECONDARYCELL_MEAS =
+      messages::metric::KCellularLteSecondaryCellMeasurements;
+  static constexpr std::int64_t K_CELLULAR_MM_INFO = messages::metric::KCellularMmCommonInfo;
+  static constexpr std::int64_t K_CELLULAR_ACTIVE_BEARER =
+      messages::metric::KCellularActivatedBearerContexts;
+  static constexpr std::int64_t K_LTE_EMM_CTXT = messages::metric::KCellularEmmContext;
+  static constexpr std::int64_t K_CELLULAR_MM_CTXT = messages::metric::KCellularMmContext;
+  static constexpr std::int64_t K_CELLULAR_GMM_CTXT = messages::metric::KCellularGmmContext;
+  static constexpr std::int64_t K_UMTS_RRC_STATE =
+      messages::metric::KCellularWcdmaRrcConnectionState;
+  static constexpr std::int64_t K_UMTS_RRC_CONFIG =
+      messages::metric::KCellularWcdmaRrcConfiguration;
+  static constexpr std::int64_t K_UMTS_SCELL_INFO = messages::metric::KCellularWcdmaCellInfo;
+  static constexpr std::int64_t K_UMTS_SCELL_MEAS =
+      messages::metric::KCellularWcdmaScellMeasurement;
+  static constexpr std::int64_t K_UMTS_TX_POWER = messages::metric::KCellularWcdmaTxPower;
+  static constexpr std::int64_t K_UMTS_SEL_RESEL_INFO =
+      messages::metric::KCellularWcdmaSelReselCellInfo;
+  static constexpr std::int64_t K_UMTS_NCELL_MEAS = messages::metric::KCellularWcdmaNbrCellMeas;
+  static constexpr std::int64_t K_GSM_SCELL_INFO = messages::metric::KCellularGsmScellInfo;
+  static constexpr std::int64_t K_GSM_IDLE_CONFIG = messages::metric::KCellularGsmIdleConfig;
+  static constexpr std::int64_t K_GSM_IDLE_SCELL_MEAS =
+      messages::metric::KCellularGsmIdleScellMeasurement;
+  static constexpr std::int64_t K_GSM_CS_RF_MEAS = messages::metric::KCellularGsmCsRfMeasurement;
+  static constexpr std::int64_t K_GSM_NCELL_MEAS = messages::metric::KCellularGsmGrrEventMeasCr;
+  static constexpr std::int64_t K_GSM_GPRS_CONFIG = messages::metric::KCellularGsmGprsConfig;
+  static constexpr std::int64_t K_SIM_FILE_INFO = messages::metric::KCellularSimCardFiles;
 
   // Keys of a metric record.
   static constexpr std::string_view metricIDKey = "kKeyMetricID";
@@ -116,6 +132,15 @@ class MetricValidator : public TarnWrapperDelegate {
   // decode; the store then keeps what it had.
   virtual bool isMetricIDValidWithMetricdict(const platform::Dictionary& metric);
 
+  // Told after each metric that changed the store, in the order added, which display dictionary
+  // the metric replaced; the store is converted by then. What keeps data derived from the store
+  // (the graphs' series) is added by the app, so the store knows nothing of it.
+  using StoreObserver =
+      std::function<void(DisplayDictionary replaced, const MetricValidator& store)>;
+  void addStoreObserver(StoreObserver observer) {
+    storeObservers_.push_back(std::move(observer));
+  }
+
   // "yyyy-MM-dd HH:mm:ss zzz" in the current time zone and locale; fractions of a second are
   // dropped. Empty when the time cannot be shown as a date.
   virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
@@ -124,6 +149,7 @@ class MetricValidator : public TarnWrapperDelegate {
   TarnWrapper* const mySharedTarnInstance_;
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
+  std::vector<StoreObserver> storeObservers_;
 };
 
 }  // namespace store

@@ -1,6 +1,5 @@
 #include "messages/Records.h"
 #include "store/Conversions.h"
-#include "store/MetricValidator.h"
 
 // The seven UMTS (WCDMA) handlers. Neighbour levels arrive as measurement indexes; each list
 // element also gets the time of its metric.
@@ -53,24 +52,22 @@ constexpr HandlerStep kNeighbourSteps[] = {
              &displayDictionary, kTimestampKey, kLteLevels},
 };
 
-using V = MetricValidator;
 using D = DisplayDictionary;
 
 constexpr Handler kHandlers[] = {
-    {V::K_UMTS_RRC_STATE, &decodeDisplayDictionary<KCellularWcdmaRrcConnectionState>,
-     D::UMTSRRCState, "Received UMTS RRC Connection State is ", kTimestampThenLog},
-    {V::K_UMTS_RRC_CONFIG, &decodeDisplayDictionary<KCellularWcdmaRrcConfiguration>,
-     D::UMTSRRCConfig, "Received UMTS RRC Configuration is ", kTimestampThenLog},
-    {V::K_UMTS_SCELL_INFO, &decodeDisplayDictionary<KCellularWcdmaCellInfo>, D::UMTSCellInfo,
-     "Received UMTS Serving Cell Info is ", kTimestampThenLog},
-    {V::K_UMTS_SCELL_MEAS, &decodeDisplayDictionary<KCellularWcdmaScellMeasurement>,
-     D::UMTSCellMeas, "Received UMTS Serving Cell Meas is ", kServingCellMeasSteps},
-    {V::K_UMTS_TX_POWER, &decodeDisplayDictionary<KCellularWcdmaTxPower>, D::UMTSTxPower,
-     "Received Tx Power is ", kTxPowerSteps},
-    {V::K_UMTS_SEL_RESEL_INFO, &decodeDisplayDictionary<KCellularWcdmaSelReselCellInfo>,
-     D::UMTSSelResel, "Received UMTS Cell Resel Info is ", kReselectionSteps},
-    {V::K_UMTS_NCELL_MEAS, &decodeDisplayDictionary<KCellularWcdmaNbrCellMeas>, D::UMTSNbrMeas,
-     "Received UMTS InterRat Meas Info is ", kNeighbourSteps},
+    recordHandler<KCellularWcdmaRrcConnectionState>(
+        D::UMTSRRCState, "Received UMTS RRC Connection State is ", kTimestampThenLog),
+    recordHandler<KCellularWcdmaRrcConfiguration>(
+        D::UMTSRRCConfig, "Received UMTS RRC Configuration is ", kTimestampThenLog),
+    recordHandler<KCellularWcdmaCellInfo>(D::UMTSCellInfo, "Received UMTS Serving Cell Info is ",
+                                          kTimestampThenLog),
+    recordHandler<KCellularWcdmaScellMeasurement>(
+        D::UMTSCellMeas, "Received UMTS Serving Cell Meas is ", kServingCellMeasSteps),
+    recordHandler<KCellularWcdmaTxPower>(D::UMTSTxPower, "Received Tx Power is ", kTxPowerSteps),
+    recordHandler<KCellularWcdmaSelReselCellInfo>(
+        D::UMTSSelResel, "Received UMTS Cell Resel Info is ", kReselectionSteps),
+    recordHandler<KCellularWcdmaNbrCellMeas>(D::UMTSNbrMeas, "Received UMTS InterRat Meas Info is ",
+                                             kNeighbourSteps),
 };
 
 }  // namespace

@@ -101,15 +101,14 @@ TEST(ARecordingReplayedByTarnd, FillsAClientsStoreAsTheIntakeOfTheRecordingDoes)
 
   store::MetricValidator received(nullptr);
   const auto pass = std::make_shared<OnePass>(received);
-  tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
+  tarn::dbus::BusTransport transport(bus.address());
   {
-    TarnWrapper session;
+    TarnWrapper session(transport);
     session.setDelegate(pass);
     ASSERT_TRUE(session.addVelaConfigForAppId("vexmora", configuration.string()));
     session.listen();
     platform::runMainQueueUntil([&] { return pass->complete(); }, 20s);
   }
-  tarn::client::useTransport(nullptr);
   EXPECT_EQ(replay->stop(SIGTERM, 10s), 0) << replay->standardError();
   ASSERT_TRUE(pass->complete());
   EXPECT_EQ(pass->handedOn(), records);

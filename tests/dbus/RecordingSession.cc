@@ -9,8 +9,9 @@ namespace bustest {
 
 using tarn::ipc::Object;
 
-RecordingSession::RecordingSession(const std::string& clientName)
-    : manager_(tarn::client::CreateManager(clientName, queue_)) {
+RecordingSession::RecordingSession(tarn::client::Transport& transport,
+                                   const std::string& clientName)
+    : manager_(tarn::client::CreateManager(clientName, queue_, transport)) {
   if (!manager_) return;
   for (const std::string_view name : {tarn::kEventMetric, tarn::kEventTrigger}) {
     tarn::client::RegisterEventHandler(

@@ -11,6 +11,7 @@
 
 #include "platform/SerialQueue.h"
 #include "tarn/client/Client.h"
+#include "tarn/client/Transport.h"
 
 namespace bustest {
 
@@ -21,12 +22,13 @@ struct ReceivedEvent {
   bool operator==(const ReceivedEvent&) const = default;
 };
 
-// A client library session, through the transport in use, with its events on, that keeps every
-// event it receives.
+// A client library session over `transport`, with its events on, that keeps every event it
+// receives.
 class RecordingSession {
  public:
   // The session is empty when the service could not be reached.
-  explicit RecordingSession(const std::string& clientName = "vexmora");
+  explicit RecordingSession(tarn::client::Transport& transport,
+                            const std::string& clientName = "vexmora");
   ~RecordingSession();
   RecordingSession(const RecordingSession&) = delete;
   RecordingSession& operator=(const RecordingSession&) = delete;

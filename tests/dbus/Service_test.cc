@@ -156,12 +156,8 @@ std::set<std::string> membersIn(const std::string& xml) {
 
 class AServiceOnABus : public ::testing::Test {
  protected:
-  AServiceOnABus() {
-    tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
-  }
-  ~AServiceOnABus() override { tarn::client::useTransport(nullptr); }
-
   bustest::PrivateBus bus;
+  tarn::dbus::BusTransport transport{bus.address()};
   std::shared_ptr<tarn::testing::ScriptedMetricSource> source =
       std::make_shared<tarn::testing::ScriptedMetricSource>();
   std::shared_ptr<tarn::service::Core> core = std::make_shared<tarn::service::Core>(source);
@@ -169,7 +165,7 @@ class AServiceOnABus : public ::testing::Test {
 };
 
 TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceGave) {
-  RecordingSession session;
+  RecordingSession session(transport);
   const struct {
     std::string_view command;
     Object input;
@@ -222,7 +218,7 @@ TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceG
 }
 
 TEST_F(AServiceOnABus, DeliversTheSubscribedMetricsAndQueryAnswersInTheirOrder) {
-  RecordingSession session;
+  RecordingSession session(transport);
   ASSERT_EQ(session.configure("profile 7\n0x3C4E04\n0x3CD313\n"), CommandResult{});
   source->answerQueriesWith({kSimFiles, {5, 5}});
 
@@ -250,9 +246,9 @@ TEST_F(AServiceOnABus, DeliversTheSubscribedMetricsAndQueryAnswersInTheirOrder) 
 }
 
 TEST_F(AServiceOnABus, GivesEachClientOnlyWhatItsOwnConfigurationSubscribes) {
-  RecordingSession rrc;
-  RecordingSession ca;
-  RecordingSession unconfigured;
+  RecordingSession rrc(transport);
+  RecordingSession ca(transport);
+  RecordingSession unconfigured(transport);
   ASSERT_EQ(rrc.configure("0x3C4E04"), CommandResult{});
   ASSERT_EQ(ca.configure("profile 5\n0x3CD313"), CommandResult{});
   source->answerQueriesWith({kSimFiles, {1}});
@@ -335,7 +331,7 @@ TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKe
   EXPECT_EQ(owner.perform(session, tarn::kCommandAddConfiguration,
                           withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))})),
             CommandResult{});
-  RecordingSession bystander;
+  RecordingSession bystander(transport);
   ASSERT_EQ(bystander.configure("0x3C4E04"), CommandResult{});
   source->emit({kRrcState, {4}});
   EXPECT_EQ(bystander.waitFor(1), std::vector{metricEvent(kRrcState, {4}, 0)});
@@ -358,7 +354,7 @@ TEST_F(AServiceOnABus, EndsASessionThatItsOwnerCloses) {
 
 TEST_F(AServiceOnABus, ForgetsAClientThatLeavesTheBusAndKeepsServingTheOthers) {
   platform::log::Capture log;
-  RecordingSession stays;
+  RecordingSession stays(transport);
   ASSERT_EQ(stays.configure("0x3C4E04"), CommandResult{});
   auto leaves = std::make_unique<RawClient>(bus.address());
   const std::string leaverName = leaves->uniqueName();

@@ -61,24 +61,13 @@ std::vector<std::string> linesOf(const std::string& text) {
   return lines;
 }
 
-// Sessions created while this lives reach the service through the bus at `address`.
-class BusTransportInUse {
- public:
-  explicit BusTransportInUse(const std::string& address) {
-    tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(address));
-  }
-  ~BusTransportInUse() { tarn::client::useTransport(nullptr); }
-  BusTransportInUse(const BusTransportInUse&) = delete;
-  BusTransportInUse& operator=(const BusTransportInUse&) = delete;
-};
-
 TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationWhenItReturns) {
   TemporaryFolder folder;
   PrivateBus bus;
-  BusTransportInUse transport(bus.address());
+  tarn::dbus::BusTransport transport(bus.address());
   auto first = startTarnd(bus.address(), kSimulator, folder / "first");
   ASSERT_TRUE(bus.waitForName(kBusName, true)) << first->standardError();
-  RecordingSession session;
+  RecordingSession session(transport);
   ASSERT_TRUE(session.manager());
   ASSERT_EQ(session.configure("profile 1\n" + std::string(kMeasurements)), CommandResult{});
   const std::vector<ReceivedEvent> before = session.waitFor(5);
@@ -126,8 +115,8 @@ TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationW
 TEST(ASessionWithTarnd, OpenedBeforeTheServiceStartsReceivesWhatItAskedForOnceItComes) {
   TemporaryFolder folder;
   PrivateBus bus;
-  BusTransportInUse transport(bus.address());
-  RecordingSession session;
+  tarn::dbus::BusTransport transport(bus.address());
+  RecordingSession session(transport);
   ASSERT_TRUE(session.manager());
   EXPECT_EQ(session.configure("profile 4\n" + std::string(kMeasurements)).status,
             tarn::status::kServiceUnavailable);
@@ -170,8 +159,8 @@ TEST(ATarnd, ReplaysALogReportingEachBrokenLineWithItsNumber) {
   ASSERT_TRUE(bus.waitForName(kBusName, true)) << tarnd->standardError();
   // The replay waits for its first listener.
   EXPECT_EQ(lineCount(recording), 0u);
-  BusTransportInUse transport(bus.address());
-  RecordingSession listener;
+  tarn::dbus::BusTransport transport(bus.address());
+  RecordingSession listener(transport);
   ASSERT_TRUE(eventually([&] { return lineCount(recording) == 2; }));
   EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0);
 

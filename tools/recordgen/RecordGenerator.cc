@@ -7,6 +7,7 @@
 #include <stdexcept>
 
 #include "FieldTable.h"
+#include "MetricTable.h"
 #include "Naming.h"
 #include "RecordEmitter.h"
 
@@ -20,6 +21,11 @@ using google::protobuf::compiler::GeneratorContext;
 constexpr const char* kBanner =
     "// GENERATED CODE from $source$ by recordgen. DO NOT EDIT.\n"
     "// The schema in proto/ is the single source of truth.\n\n";
+
+// options.proto declares the generator's options and the messages they take; it holds no records.
+bool declaresOptions(const FileDescriptor& file) {
+  return file.extension_count() > 0;
+}
 
 // A record must follow every record whose enums its accessors name.
 std::vector<const Descriptor*> definitionOrder(const FileDescriptor& file) {
@@ -70,7 +76,7 @@ void writeHeader(const FileDescriptor& file, const std::vector<const Descriptor*
       "#include \"platform/Value.h\"\n");
   for (int i = 0; i < file.dependency_count(); ++i) {
     const auto* dependency = file.dependency(i);
-    if (dependency->message_type_count() == 0 && dependency->enum_type_count() == 0) continue;
+    if (declaresOptions(*dependency)) continue;
     p.Print("#include \"messages/$stem$.records.h\"\n", "stem", fileStem(*dependency));
   }
   p.Print("\nnamespace messages {\n\n");
@@ -202,13 +208,14 @@ bool RecordGenerator::GenerateAll(const std::vector<const FileDescriptor*>& file
                                   std::string* error) const {
   std::vector<const FileDescriptor*> schemas;
   for (const auto* file : files) {
-    if (file->message_type_count() == 0) continue;  // option declarations
+    if (declaresOptions(*file)) continue;
     if (!Generate(file, parameter, context, error)) return false;
     schemas.push_back(file);
   }
   try {
     writeRegistry(schemas, *context);
     writeFieldTable(schemas, *context);
+    writeMetricTable(schemas, *context);
     return true;
   } catch (const std::exception& failure) {
     *error = failure.what();

@@ -6,7 +6,7 @@ namespace recordgen {
 
 // A protoc plugin: for each schema file x.proto it writes x.records.h and
 // x.records.cc, and for the whole run Records.h and Records.cc, which include
-// every record and list every record class.
+// every record and list every record class, and Metrics.h, the table of metrics.
 class RecordGenerator : public google::protobuf::compiler::CodeGenerator {
  public:
   bool Generate(const google::protobuf::FileDescriptor* file, const std::string& parameter,

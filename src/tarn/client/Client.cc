@@ -4,8 +4,7 @@
 
 #include "platform/Log.h"
 #include "tarn/client/Manager.h"
-#include "tarn/service/Core.h"
-#include "tarn/transport/InProcess.h"
+#include "tarn/client/Transport.h"
 
 namespace tarn::client {
 
@@ -22,9 +21,6 @@ struct TransportChoice {
 
   std::shared_ptr<Transport> current() {
     const std::lock_guard lock(mutex);
-    if (!transport) {
-      transport = std::make_shared<transport::InProcess>(std::make_shared<service::Core>());
-    }
     return transport;
   }
 };
@@ -44,8 +40,18 @@ void useTransport(std::shared_ptr<Transport> transport) {
   choice.transport = std::move(transport);
 }
 
+std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue,
+                                       Transport& transport) {
+  return Manager::open(clientName, std::move(queue), transport);
+}
+
 std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue) {
   const std::shared_ptr<Transport> transport = TransportChoice::instance().current();
+  if (!transport) {
+    platform::log::systemf("tarn::client::CreateManager: no transport chosen; no session for %s",
+                           clientName.c_str());
+    return nullptr;
+  }
   return Manager::open(clientName, std::move(queue), *transport);
 }
 

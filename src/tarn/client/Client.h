@@ -23,8 +23,15 @@ class CompletionGroup {};
 
 using EventHandler = std::function<void(const ipc::Object& event, CompletionGroup group)>;
 
-// Opens a session under `clientName` with the transport in use (see Transport.h). The session's
-// events are delivered on `queue`. Empty when the service cannot be reached.
+class Transport;
+
+// Opens a session under `clientName` over `transport`. The session's events are delivered on
+// `queue`. Empty when the service cannot be reached.
+std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue,
+                                       Transport& transport);
+
+// The same over the transport the application chose (useTransport); empty, with a log line,
+// while it has chosen none.
 std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue);
 
 // Sends one command and waits for its result on the calling thread. An empty handle gives status

@@ -33,9 +33,9 @@ class Transport {
   virtual std::unique_ptr<Connection> connect(const std::string& clientName, EventSink sink) = 0;
 };
 
-// Chooses the transport of the sessions created from now on; sessions already open keep theirs.
-// Until a process chooses, sessions reach a service that runs inside the process and reports no
-// metrics.
+// The application's choice of transport for the sessions created from now on without one;
+// sessions already open keep theirs. The library knows no service of its own: until the
+// application chooses, such sessions are not opened.
 void useTransport(std::shared_ptr<Transport> transport);
 
 }  // namespace tarn::client

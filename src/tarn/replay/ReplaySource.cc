@@ -6,6 +6,7 @@
 #include <ostream>
 #include <stdexcept>
 
+#include "messages/Metrics.h"
 #include "tarn/log/MetricLog.h"
 
 namespace tarn::replay {
@@ -13,7 +14,7 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
-constexpr std::uint32_t kSimFiles = 0x3C0013;
+using messages::metric::KCellularSimCardFiles;
 
 ReplayOptions checked(ReplayOptions options) {
   if (options.speed && !(*options.speed > 0.0))
@@ -54,7 +55,7 @@ ReplaySource::ReplaySource(const std::string& path, ReplayOptions options, std::
       continue;
     }
     lastMs = line->parsed.entry->deliveryMs.value_or(lastMs);
-    if (metric->metricId == kSimFiles) simFiles_ = *metric;
+    if (metric->metricId == KCellularSimCardFiles) simFiles_ = *metric;
     metrics_.push_back({lastMs, std::move(*metric)});
   }
   if (reader.failed()) throw std::runtime_error("cannot read " + path + " to its end");
@@ -81,7 +82,7 @@ void ReplaySource::stop() {
 }
 
 std::optional<service::Metric> ReplaySource::query(std::uint32_t metricId) {
-  if (metricId != kSimFiles) return std::nullopt;
+  if (metricId != KCellularSimCardFiles) return std::nullopt;
   return simFiles_;
 }
 

@@ -39,8 +39,9 @@ struct Event {
 // A session with events on that keeps what it receives.
 class Session {
  public:
-  Session(const std::string& clientName, const platform::SerialQueue& queue)
-      : manager_(client::CreateManager(clientName, queue)) {
+  Session(const std::string& clientName, const platform::SerialQueue& queue,
+          client::Transport& transport)
+      : manager_(client::CreateManager(clientName, queue, transport)) {
     for (const std::string_view name : {kEventMetric, kEventTrigger}) {
       client::RegisterEventHandler(
           manager_, std::string(name), [this, name](const Object& record, client::CompletionGroup) {
@@ -91,10 +92,7 @@ Dictionary metricRecord(std::uint32_t metricId, platform::Bytes payload, std::in
 
 class AService : public ::testing::Test {
  protected:
-  AService() {
-    client::useTransport(std::make_shared<transport::InProcess>(core));
-    commander = client::CreateManager("commander", queue);
-  }
+  AService() { commander = client::CreateManager("commander", queue, inProcess); }
 
   CommandResult perform(std::string_view command, const Object& input) {
     Object output;
@@ -108,12 +106,13 @@ class AService : public ::testing::Test {
   std::shared_ptr<tarn::testing::ScriptedMetricSource> source =
       std::make_shared<tarn::testing::ScriptedMetricSource>();
   std::shared_ptr<service::Core> core = std::make_shared<service::Core>(source);
+  transport::InProcess inProcess{core};
   platform::SerialQueue queue{"org.norvo.test.sessions"};
   std::shared_ptr<client::Manager> commander;
 };
 
 TEST_F(AService, DeliversOnlyTheSubscribedMetricsAsRecordsUnderTheirProfile) {
-  Session app("vexmora", queue);
+  Session app("vexmora", queue, inProcess);
   ASSERT_EQ(configure("profile 7\n0x3C4E04\n"), CommandResult{});
 
   source->emit({kCaStatus, {9}});
@@ -127,7 +126,7 @@ TEST_F(AService, DeliversOnlyTheSubscribedMetricsAsRecordsUnderTheirProfile) {
 }
 
 TEST_F(AService, ReplacesAConfigurationForgetsAClearedOneAndAnswersQueriesRegardless) {
-  Session app("vexmora", queue);
+  Session app("vexmora", queue, inProcess);
   source->answerQueriesWith({kSimFiles, {5}});
   ASSERT_EQ(configure("0x3C4E04"), CommandResult{});
   ASSERT_EQ(configure("0x3CD313"), CommandResult{});
@@ -157,10 +156,10 @@ TEST_F(AService, ReplacesAConfigurationForgetsAClearedOneAndAnswersQueriesRegard
 }
 
 TEST_F(AService, SendsEventsOnlyToTheAppsSessionsWhoseEventsAreOn) {
-  Session first("vexmora", queue);
-  Session second("vexmora", queue);
-  Session silenced("vexmora", queue);
-  Session stranger("someone-else", queue);
+  Session first("vexmora", queue, inProcess);
+  Session second("vexmora", queue, inProcess);
+  Session silenced("vexmora", queue, inProcess);
+  Session stranger("someone-else", queue, inProcess);
   client::EventsOff(silenced.manager());
   ASSERT_EQ(configure("0x3C4E04"), CommandResult{});
 
@@ -226,9 +225,10 @@ TEST(AClientSession, AnswersWithAStatusWhenItsHandleIsEmptyOrItsServiceHasGone) 
                                                         "manager handle is empty)"});
 
   auto core = std::make_shared<service::Core>();
-  client::useTransport(std::make_shared<transport::InProcess>(core));
-  const auto manager = client::CreateManager("vexmora", platform::SerialQueue("org.norvo.test"));
-  client::useTransport(nullptr);
+  auto inProcess = std::make_unique<transport::InProcess>(core);
+  const auto manager =
+      client::CreateManager("vexmora", platform::SerialQueue("org.norvo.test"), *inProcess);
+  inProcess.reset();
   core.reset();
   EXPECT_EQ(
       client::PerformCommand(manager, "ClearConfiguration", withAppId({}), output),

@@ -61,17 +61,8 @@ void GsmLink::reselect(const Step& step) {
   const bool better =
       best && *best != *state_.serving &&
       levels[*best].rxlevDbm > levels[*state_.serving].rxlevDbm + kReselectHysteresisDb;
-  if (!better) {
-    candidate_.reset();
-    return;
-  }
-  if (candidate_ != best) {
-    candidate_ = best;
-    candidateDwell_.reset();
-  }
-  if (!candidateDwell_.track(true, step.ms, kReselectionMs)) return;
+  if (!candidate_.settled(better ? best : std::nullopt, step.ms, kReselectionMs)) return;
   state_.serving = best;
-  candidate_.reset();
   step.report(Change::GsmCell);
 }
 

@@ -38,8 +38,7 @@ class GsmLink {
   GsmState state_;
   double dedicatedLeftMs_ = 0.0;
   bool signallingFinished_ = false;
-  std::optional<std::size_t> candidate_;
-  Dwell candidateDwell_;
+  Candidate candidate_;
   Dwell umtsSeen_;
   Dwell lteSeen_;
 };

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <cmath>
 
-#include "tarn/sim/MetricIds.h"
+#include "messages/Metrics.h"
 #include "tarn/sim/Units.h"
 
 namespace tarn::sim::gsm_reports {
@@ -50,7 +50,7 @@ service::Metric servingCellInfo(const ReportContext& context) {
   record.setState(context.phone.gsm().dedicated ? KCellularGsmScellInfo::DEDICATED_STATE
                                                 : KCellularGsmScellInfo::NON_DEDICATED_STATE);
   record.setNumMncDigits(plmn.mncDigits);
-  return metricOf(metric_id::kGsmServingCellInfo, record);
+  return metricOf(messages::metric::KCellularGsmScellInfo, record);
 }
 
 service::Metric idleConfig(const ReportContext& context) {
@@ -91,7 +91,7 @@ service::Metric idleConfig(const ReportContext& context) {
   record.setReestAllowed(1);
   record.setEcsc(1);
   record.setSi2TerNeeded(1);
-  return metricOf(metric_id::kGsmIdleConfig, record);
+  return metricOf(messages::metric::KCellularGsmIdleConfig, record);
 }
 
 service::Metric idleServingMeasurement(const ReportContext& context) {
@@ -102,7 +102,7 @@ service::Metric idleServingMeasurement(const ReportContext& context) {
   record.setCurrentAntenna(0);
   const double rxlev = servingRxlevDbm(context) + context.fading.normal(0.0, 1.5);
   record.setIdleRxlevDBm(units::wholeDb(std::clamp(rxlev, -110.0, -47.0)));
-  return metricOf(metric_id::kGsmIdleServingMeas, record);
+  return metricOf(messages::metric::KCellularGsmIdleScellMeasurement, record);
 }
 
 service::Metric csRfMeasurement(const ReportContext& context) {
@@ -122,7 +122,7 @@ service::Metric csRfMeasurement(const ReportContext& context) {
   record.setCsRxlevSub(units::rxlevIndex(rxlev));
   record.setCsRxqualSub(rxqual(rxlev, context.fading));
   record.setScellBand(static_cast<std::uint32_t>(cell.band));
-  return metricOf(metric_id::kGsmCsRfMeas, record);
+  return metricOf(messages::metric::KCellularGsmCsRfMeasurement, record);
 }
 
 service::Metric neighbourMeasurement(const ReportContext& context) {
@@ -167,7 +167,7 @@ service::Metric neighbourMeasurement(const ReportContext& context) {
     neighbour->setRsrq(units::rsrqIndex(level.rsrqDb + context.fading.normal(0.0, 0.7)));
     record.addLteNcellMeas(neighbour);
   }
-  return metricOf(metric_id::kGsmNeighbourMeas, record);
+  return metricOf(messages::metric::KCellularGsmGrrEventMeasCr, record);
 }
 
 service::Metric gprsConfig(const ReportContext& context) {
@@ -183,7 +183,7 @@ service::Metric gprsConfig(const ReportContext& context) {
   record.setExtUplTbfSupported(true);
   record.setPriorityClass(0);
   record.setCellBarAccess2(0);
-  return metricOf(metric_id::kGsmGprsConfig, record);
+  return metricOf(messages::metric::KCellularGsmGprsConfig, record);
 }
 
 }  // namespace tarn::sim::gsm_reports

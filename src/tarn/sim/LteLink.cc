@@ -197,21 +197,12 @@ std::optional<std::size_t> LteLink::preferredCell(const Step& step, bool connect
 }
 
 bool LteLink::reselect(const Step& step, bool connected) {
-  const auto target = preferredCell(step, connected);
-  if (!target || target == state_.serving) {
-    candidate_.reset();
+  auto target = preferredCell(step, connected);
+  if (target == state_.serving) target.reset();
+  if (!candidate_.settled(target, step.ms, connected ? kTimeToTriggerMs : kReselectionMs))
     return false;
-  }
-  if (candidate_ != target) {
-    candidate_ = target;
-    candidateDwell_.reset();
-  }
-  if (!candidateDwell_.track(true, step.ms, connected ? kTimeToTriggerMs : kReselectionMs)) {
-    return false;
-  }
   if (connected) dropSecondaries(step);
   state_.serving = target;
-  candidate_.reset();
   step.report(Change::LteCell);
   return true;
 }

@@ -45,8 +45,7 @@ class LteLink {
   const Network& network_;
   LteState state_;
   LteCause connectCause_ = messages::KCellularLteRrcState::KLTE_RRC_CAUSE_EST_MO_DATA;
-  std::optional<std::size_t> candidate_;
-  Dwell candidateDwell_;
+  Candidate candidate_;
   Dwell cellSearch_;
   Dwell outOfSync_;       // radio link monitoring (T310)
   Dwell edgeOfCoverage_;  // inter-RAT measurement before a redirection

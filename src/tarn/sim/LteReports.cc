@@ -5,8 +5,8 @@
 #include <cmath>
 
 #include "codec/Writer.h"
+#include "messages/Metrics.h"
 #include "tarn/sim/Bands.h"
-#include "tarn/sim/MetricIds.h"
 #include "tarn/sim/Units.h"
 
 namespace tarn::sim::lte_reports {
@@ -64,7 +64,7 @@ service::Metric rrcState(const ReportContext& context) {
   record.setPrevState(lte.previousRrc);
   record.setPrevStateDurMs(lte.previousDurationMs);
   record.setCause(lte.cause);
-  return metricOf(metric_id::kLteRrcState, record);
+  return metricOf(messages::metric::KCellularLteRrcState, record);
 }
 
 service::Metric cdrxConfig(const ReportContext& context) {
@@ -84,7 +84,7 @@ service::Metric cdrxConfig(const ReportContext& context) {
     record.setDrxShortCycleNum(4);
     record.setTransmissionMode(3);
   }
-  return metricOf(metric_id::kLteCdrxConfig, record);
+  return metricOf(messages::metric::KCellularLteCdrxConfig, record);
 }
 
 service::Metric radioLinkFailure(const ReportContext& context) {
@@ -95,7 +95,7 @@ service::Metric radioLinkFailure(const ReportContext& context) {
   writer.writeUint32(kT310Expiry, 2);
   writer.writeUint32(cell.pci, 3);
   writer.writeUint32(cell.dlEarfcn, 4);
-  return {metric_id::kLteRadioLinkFailure, writer.take()};
+  return {messages::metric::KCellularLteRadioLinkFailure, writer.take()};
 }
 
 service::Metric servingCellInfo(const ReportContext& context) {
@@ -116,7 +116,7 @@ service::Metric servingCellInfo(const ReportContext& context) {
   record.setNumMncDigits(plmn.mncDigits);
   record.setSelPlmnMcc(plmn.mcc);
   record.setSelPlmnMnc(plmn.mnc);
-  return metricOf(metric_id::kLteServingCellInfo, record);
+  return metricOf(messages::metric::KCellularLteScellInfo, record);
 }
 
 service::Metric selReselInfo(const ReportContext& context) {
@@ -170,7 +170,7 @@ service::Metric selReselInfo(const ReportContext& context) {
     neighbour->setBand(layer.band);
     record.addNbrEutra(neighbour);
   }
-  return metricOf(metric_id::kLteSelReselInfo, record);
+  return metricOf(messages::metric::KCellularLteSelReselCellInfo, record);
 }
 
 service::Metric servingCellMeasurement(const ReportContext& context) {
@@ -186,7 +186,7 @@ service::Metric servingCellMeasurement(const ReportContext& context) {
     info->setSnr(wholeDb(level.sinrDb));
     record.addRxInfo(info);
   }
-  return metricOf(metric_id::kLteServingCellMeas, record);
+  return metricOf(messages::metric::KCellularLteServingCellMeasurement, record);
 }
 
 service::Metric txPower(const ReportContext& context) {
@@ -209,7 +209,7 @@ service::Metric txPower(const ReportContext& context) {
     sample->setSubframeIndex(subframe);
     record.addTxPowerInfo(sample);
   }
-  return metricOf(metric_id::kLteTxPower, record);
+  return metricOf(messages::metric::KCellularLteTxPower, record);
 }
 
 service::Metric rsrpRsrqSinr(const ReportContext& context) {
@@ -236,7 +236,7 @@ service::Metric rsrpRsrqSinr(const ReportContext& context) {
     accumulate(average[1], antenna1);
   }
   record.setAvgValues(rsrpRsrqSinrOf(pci, average[0], average[1]));
-  return metricOf(metric_id::kLteRsrpRsrqSinr, record);
+  return metricOf(messages::metric::KCellularLteRsrpRsrqSinr, record);
 }
 
 service::Metric componentCarriers(const ReportContext& context) {
@@ -261,7 +261,7 @@ service::Metric componentCarriers(const ReportContext& context) {
     record.setScc1Earfcn(configured[1]->dlEarfcn);
     record.setScc1Bandwidth(configured[1]->bandwidthCode);
   }
-  return metricOf(metric_id::kLteComponentCarriers, record);
+  return metricOf(messages::metric::KCellularLteComponentCarrierInfo, record);
 }
 
 service::Metric carrierAggregationStatus(const ReportContext& context) {
@@ -285,7 +285,7 @@ service::Metric carrierAggregationStatus(const ReportContext& context) {
     carrier->setRssi(centiDb(level.rssiDbm));
     record.addSccList(carrier);
   }
-  return metricOf(metric_id::kLteCaStatus, record);
+  return metricOf(messages::metric::KCellularLteCarrierAggregationStatus, record);
 }
 
 service::Metric secondaryCellMeasurement(const ReportContext& context) {
@@ -302,7 +302,7 @@ service::Metric secondaryCellMeasurement(const ReportContext& context) {
     measurement->setRssi(centiDb(level.rssiDbm));
     record.addSccRxMeasurement(measurement);
   }
-  return metricOf(metric_id::kLteSecondaryCellMeas, record);
+  return metricOf(messages::metric::KCellularLteSecondaryCellMeasurements, record);
 }
 
 service::Metric neighbourMeasurement(const ReportContext& context) {
@@ -321,7 +321,7 @@ service::Metric neighbourMeasurement(const ReportContext& context) {
     neighbour->setNbrRsrq(static_cast<std::int32_t>(units::rsrqIndex(level.rsrqDb)));
     record.addMeasNbrEutra(neighbour);
   }
-  return metricOf(metric_id::kLteNeighbourMeas, record);
+  return metricOf(messages::metric::KCellularLteNbrEutraCellMeas, record);
 }
 
 service::Metric interRatMeasurement(const ReportContext& context) {
@@ -348,7 +348,7 @@ service::Metric interRatMeasurement(const ReportContext& context) {
         units::rxlevIndex(context.radio.gsm()[i].rxlevDbm + context.fading.normal(0.0, 1.5)));
     record.addMeasNbrGeran(neighbour);
   }
-  return metricOf(metric_id::kLteInterRatMeas, record);
+  return metricOf(messages::metric::KCellularLteNbrInterRatCellMeas, record);
 }
 
 }  // namespace tarn::sim::lte_reports

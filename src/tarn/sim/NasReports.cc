@@ -1,6 +1,6 @@
 #include "tarn/sim/NasReports.h"
 
-#include "tarn/sim/MetricIds.h"
+#include "messages/Metrics.h"
 
 namespace tarn::sim::nas_reports {
 namespace {
@@ -43,7 +43,7 @@ service::Metric emmContext(const ReportContext& context) {
   record.setT3412DurS(kT3412S);
   record.setIsImsVoiceSupported(true);
   record.setIsEmergBearerSupported(true);
-  return metricOf(metric_id::kEmmContext, record);
+  return metricOf(messages::metric::KCellularEmmContext, record);
 }
 
 service::Metric mmContext(const ReportContext& context) {
@@ -64,7 +64,7 @@ service::Metric mmContext(const ReportContext& context) {
   record.setProcFailureCause(KCellularMmContext::KNAS_MM_PROC_FAILURE_CAUSE_NONE);
   record.setRejectCause(KCellularMmContext::KNAS_MM_REJ_CAUSE_NONE);
   record.setIsCombinedProc(nas.combined);
-  return metricOf(metric_id::kMmContext, record);
+  return metricOf(messages::metric::KCellularMmContext, record);
 }
 
 service::Metric gmmContext(const ReportContext& context) {
@@ -86,7 +86,7 @@ service::Metric gmmContext(const ReportContext& context) {
   record.setProcFailureCause(KCellularMmContext::KNAS_MM_PROC_FAILURE_CAUSE_NONE);
   record.setRejectCause(KCellularMmContext::KNAS_MM_REJ_CAUSE_NONE);
   record.setRegProc(nas.gmmProcedure);
-  return metricOf(metric_id::kGmmContext, record);
+  return metricOf(messages::metric::KCellularGmmContext, record);
 }
 
 service::Metric mmCommonInfo(const ReportContext& context) {
@@ -96,7 +96,7 @@ service::Metric mmCommonInfo(const ReportContext& context) {
   auto home = std::make_shared<messages::Plmn>();
   home->setEncodedPlmn(identity::encodePlmn(context.network.plmn));
   record.addEplmnList(home);
-  return metricOf(metric_id::kMmCommonInfo, record);
+  return metricOf(messages::metric::KCellularMmCommonInfo, record);
 }
 
 service::Metric activeBearers(const ReportContext& context) {
@@ -118,7 +118,7 @@ service::Metric activeBearers(const ReportContext& context) {
     entry->setIsAddrIratMobile(bearer.iratMobile);
     record.addBearerContexts(entry);
   }
-  return metricOf(metric_id::kActiveBearers, record);
+  return metricOf(messages::metric::KCellularActivatedBearerContexts, record);
 }
 
 }  // namespace tarn::sim::nas_reports

@@ -5,8 +5,8 @@
 #include <utility>
 #include <vector>
 
+#include "messages/Metrics.h"
 #include "messages/Records.h"
-#include "tarn/sim/MetricIds.h"
 
 namespace tarn::sim {
 namespace {
@@ -106,7 +106,7 @@ service::Metric simFiles(const Network& network, const Subscriber& subscriber, c
     file->setContent(content);
     record.addEfList(file);
   }
-  return {metric_id::kSimFiles, record.data()};
+  return {messages::metric::KCellularSimCardFiles, record.data()};
 }
 
 }  // namespace tarn::sim

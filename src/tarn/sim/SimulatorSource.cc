@@ -5,7 +5,7 @@
 #include <stdexcept>
 #include <vector>
 
-#include "tarn/sim/MetricIds.h"
+#include "messages/Metrics.h"
 
 namespace tarn::sim {
 namespace {
@@ -53,7 +53,7 @@ void SimulatorSource::stop() {
 }
 
 std::optional<service::Metric> SimulatorSource::query(std::uint32_t metricId) {
-  if (metricId != metric_id::kSimFiles) return std::nullopt;
+  if (metricId != messages::metric::KCellularSimCardFiles) return std::nullopt;
   std::lock_guard lock(mutex_);
   return simulator_.simFiles();
 }

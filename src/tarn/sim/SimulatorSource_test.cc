@@ -8,7 +8,7 @@
 #include <thread>
 #include <vector>
 
-#include "tarn/sim/MetricIds.h"
+#include "messages/Metrics.h"
 
 namespace tarn::sim {
 namespace {
@@ -88,11 +88,11 @@ TEST(ASimulatorSource, RefusesASpeedThatIsNotAboveZero) {
 
 TEST(ASimulatorSource, AnswersAQueryForTheSimFilesOnly) {
   SimulatorSource source(2, 1.0, kStartMs);
-  const auto files = source.query(metric_id::kSimFiles);
+  const auto files = source.query(messages::metric::KCellularSimCardFiles);
   ASSERT_TRUE(files);
-  EXPECT_EQ(files->metricId, metric_id::kSimFiles);
+  EXPECT_EQ(files->metricId, messages::metric::KCellularSimCardFiles);
   EXPECT_EQ(timestampOf(*files), kStartMs);
-  EXPECT_FALSE(source.query(metric_id::kLteRrcState));
+  EXPECT_FALSE(source.query(messages::metric::KCellularLteRrcState));
 }
 
 }  // namespace

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
+#include <optional>
 
 #include "tarn/sim/PhoneState.h"
 #include "tarn/sim/Radio.h"
@@ -37,6 +39,31 @@ class Dwell {
 
  private:
   double heldMs_ = 0.0;
+};
+
+// A better cell that must stay the better one for a dwell time before the phone moves to it.
+class Candidate {
+ public:
+  // Answers whether `cell` (none when no cell beats the serving one) has now been the candidate
+  // for `neededMs`; a new cell starts the dwell anew.
+  bool settled(std::optional<std::size_t> cell, double stepMs, double neededMs) {
+    if (!cell) {
+      cell_.reset();
+      return false;
+    }
+    if (cell_ != cell) {
+      cell_ = cell;
+      dwell_.reset();
+    }
+    if (!dwell_.track(true, stepMs, neededMs)) return false;
+    cell_.reset();
+    return true;
+  }
+  void reset() { cell_.reset(); }
+
+ private:
+  std::optional<std::size_t> cell_;
+  Dwell dwell_;
 };
 
 }  // namespace tarn::sim

@@ -146,17 +146,8 @@ void UmtsLink::reselect(const Step& step, double marginDb, double dwellMs) {
   const auto& levels = step.radio.umts();
   const bool better = best && *best != *state_.serving &&
                       levels[*best].rscpDbm > levels[*state_.serving].rscpDbm + marginDb;
-  if (!better) {
-    candidate_.reset();
-    return;
-  }
-  if (candidate_ != best) {
-    candidate_ = best;
-    candidateDwell_.reset();
-  }
-  if (!candidateDwell_.track(true, step.ms, dwellMs)) return;
+  if (!candidate_.settled(better ? best : std::nullopt, step.ms, dwellMs)) return;
   state_.serving = best;
-  candidate_.reset();
   step.report(Change::UmtsCell);
 }
 

@@ -41,8 +41,7 @@ class UmtsLink {
 
   const Network& network_;
   UmtsState state_;
-  std::optional<std::size_t> candidate_;
-  Dwell candidateDwell_;
+  Candidate candidate_;
   Dwell inactivity_;
   Dwell pagingOnly_;  // time in URA_PCH without traffic
   Dwell weakLink_;

@@ -2,8 +2,8 @@
 
 #include <algorithm>
 
+#include "messages/Metrics.h"
 #include "tarn/sim/Bands.h"
-#include "tarn/sim/MetricIds.h"
 #include "tarn/sim/Units.h"
 
 namespace tarn::sim::umts_reports {
@@ -37,7 +37,7 @@ service::Metric rrcState(const ReportContext& context) {
   record.setState(umts.rrc);
   record.setEstablishmentCause(umts.establishment);
   record.setReleaseCause(umts.release);
-  return metricOf(metric_id::kUmtsRrcState, record);
+  return metricOf(messages::metric::KCellularWcdmaRrcConnectionState, record);
 }
 
 service::Metric rrcConfig(const ReportContext& context) {
@@ -53,7 +53,7 @@ service::Metric rrcConfig(const ReportContext& context) {
                                                                             : 1280);
   record.setIsMimoConfigured(false);
   record.setIsDcConfigured(dualCarrier);
-  return metricOf(metric_id::kUmtsRrcConfig, record);
+  return metricOf(messages::metric::KCellularWcdmaRrcConfiguration, record);
 }
 
 service::Metric servingCellInfo(const ReportContext& context) {
@@ -70,7 +70,7 @@ service::Metric servingCellInfo(const ReportContext& context) {
   record.setPsc(cell.psc);
   record.setNumMncDigits(plmn.mncDigits);
   record.setHspa(KCellularWcdmaCellInfo::SYS_HS_IND_HSDPA_HSUPA_SUPP_CELL);
-  return metricOf(metric_id::kUmtsServingCellInfo, record);
+  return metricOf(messages::metric::KCellularWcdmaCellInfo, record);
 }
 
 service::Metric servingCellMeasurement(const ReportContext& context) {
@@ -87,7 +87,7 @@ service::Metric servingCellMeasurement(const ReportContext& context) {
     info->setSnr(units::wholeDb(rscp - kNoiseFloorDbm));
     record.addRxInfo(info);
   }
-  return metricOf(metric_id::kUmtsServingCellMeas, record);
+  return metricOf(messages::metric::KCellularWcdmaScellMeasurement, record);
 }
 
 service::Metric txPower(const ReportContext& context) {
@@ -107,7 +107,7 @@ service::Metric txPower(const ReportContext& context) {
     sample->setSubframeIndex(subframe);
     record.addTxPowerInfo(sample);
   }
-  return metricOf(metric_id::kUmtsTxPower, record);
+  return metricOf(messages::metric::KCellularWcdmaTxPower, record);
 }
 
 service::Metric selReselInfo(const ReportContext& context) {
@@ -143,7 +143,7 @@ service::Metric selReselInfo(const ReportContext& context) {
     frequency->setPrio(1);
     record.addGsmPrioInfo(frequency);
   }
-  return metricOf(metric_id::kUmtsSelReselInfo, record);
+  return metricOf(messages::metric::KCellularWcdmaSelReselCellInfo, record);
 }
 
 service::Metric neighbourMeasurement(const ReportContext& context) {
@@ -186,7 +186,7 @@ service::Metric neighbourMeasurement(const ReportContext& context) {
         units::rsrqIndex(level.rsrqDb + context.fading.normal(0.0, 0.7))));
     record.addMeasLteResult(result);
   }
-  return metricOf(metric_id::kUmtsNeighbourMeas, record);
+  return metricOf(messages::metric::KCellularWcdmaNbrCellMeas, record);
 }
 
 }  // namespace tarn::sim::umts_reports

@@ -10,41 +10,6 @@ namespace {
 
 using platform::Bytes;
 
-// The intake's conversions, which each index must survive.
-double rsrpDbm(std::uint32_t index) {
-  return static_cast<double>(index) - 140;
-}
-double rsrqDb(std::uint32_t index) {
-  return index * 0.5 - 19.5;
-}
-double rscpDbm(std::uint32_t index) {
-  return static_cast<double>(index) - 116;
-}
-double ecnoDb(std::uint32_t index) {
-  return index * 0.5 - 24.5;
-}
-double rxlevDbm(std::uint32_t index) {
-  return static_cast<double>(index) - 110;
-}
-
-TEST(MeasurementIndexes, ConvertBackToTheMeasuredValueWithinHalfAStep) {
-  for (double dbm = -139.0; dbm <= -44.0; dbm += 0.3) {
-    EXPECT_NEAR(rsrpDbm(units::rsrpIndex(dbm)), dbm, 0.5) << dbm;
-  }
-  for (double db = -19.5; db <= -3.0; db += 0.1) {
-    EXPECT_NEAR(rsrqDb(units::rsrqIndex(db)), db, 0.25) << db;
-  }
-  for (double dbm = -116.0; dbm <= -25.0; dbm += 0.3) {
-    EXPECT_NEAR(rscpDbm(units::rscpIndex(dbm)), dbm, 0.5) << dbm;
-  }
-  for (double db = -24.5; db <= 0.0; db += 0.1) {
-    EXPECT_NEAR(ecnoDb(units::ecnoIndex(db)), db, 0.25) << db;
-  }
-  for (double dbm = -110.0; dbm <= -47.0; dbm += 0.3) {
-    EXPECT_NEAR(rxlevDbm(units::rxlevIndex(dbm)), dbm, 0.5) << dbm;
-  }
-}
-
 TEST(MeasurementIndexes, AreClampedToTheirReportingRanges) {
   EXPECT_EQ(units::rsrpIndex(-160.0), 0u);
   EXPECT_EQ(units::rsrpIndex(-20.0), 97u);

@@ -30,8 +30,9 @@ constexpr std::string_view kCommandsUsage =
     "      Write a metric log out for Wireshark, jq and pandas, or spreadsheets.\n"
     "  intake LOG.jsonl [--dump-store OUT.json]\n"
     "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
-    "  record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"
-    "      Record the metrics the simulated phone delivers into a metric log, for --replay.\n"
+    "  record OUT.jsonl [--to FORMAT] [--seconds N] [--seed S] [--speed X]\n"
+    "      Record the metrics the simulated phone delivers into a metric log, for --replay,\n"
+    "      or live as an export: norvo record --to pcapng - | wireshark -k -i -\n"
     "\n"
     "norvo <command> --help describes a command.\n";
 

@@ -41,7 +41,7 @@ std::string cellText(const platform::Value& value) {
     }
     return cell;
   }
-  const std::string json = platform::toJson(value);
+  std::string json = platform::toJson(value);
   // Bytes come out of JSON as quoted hexadecimal text; the cell wants the digits alone.
   if (value.isBytes()) return json.substr(1, json.size() - 2);
   return json;

@@ -15,6 +15,7 @@ constexpr std::uint64_t kTimestampField = 1;
 
 std::vector<KnownMetric> byMetricID() {
   std::vector<KnownMetric> metrics;
+  metrics.reserve(messages::kMetricKinds.size());
   for (const messages::MetricKind& kind : messages::kMetricKinds) {
     metrics.push_back(
         {&kind, kind.recordClass.empty() ? nullptr : messages::recordClassNamed(kind.recordClass)});

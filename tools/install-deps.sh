@@ -10,6 +10,7 @@ packages=(
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev modemmanager-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   chromium nodejs
+  tshark
 )
 
 missing=()
@@ -25,5 +26,7 @@ echo "Installing missing packages: ${missing[*]}"
 sudo=""
 [[ $(id -u) -eq 0 ]] || sudo="sudo"
 export DEBIAN_FRONTEND=noninteractive
+# wireshark-common asks whether users outside the wireshark group may capture packets: no.
+echo "wireshark-common wireshark-common/install-setuid boolean false" | $sudo debconf-set-selections
 $sudo apt-get update -qq
 $sudo apt-get install -y -qq --no-install-recommends "${missing[@]}"

@@ -19,16 +19,20 @@ namespace app {
 namespace {
 
 constexpr std::string_view kUsage =
-    "usage: norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X] [--service WHERE]\n"
+    "usage: norvo record OUT.jsonl [--to FORMAT] [--seconds N] [--seed S] [--speed X]\n"
+    "                              [--service WHERE]\n"
     "\n"
     "Runs the simulated phone, subscribes to its metrics as the viewer does and writes every\n"
     "metric delivered to OUT.jsonl as a metric log, with \"t_ms\" counted from the start, until N\n"
     "seconds have passed or Ctrl-C. --seed chooses the drive (default 1, the viewer's), --speed\n"
     "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n"
-    "--service dbus (or dbus:system, dbus:ADDRESS) records what tarnd delivers instead.\n";
+    "--service dbus (or dbus:system, dbus:ADDRESS) records what tarnd delivers instead.\n"
+    "--to pcapng|jsonl|csv writes the metrics as `norvo export` does instead, as they come; OUT\n"
+    "may then be \"-\" for standard output: norvo record --to pcapng - | wireshark -k -i -\n";
 
 struct Options {
   std::string outPath;
+  const exporting::ExportFormat* format = nullptr;  // none for a metric log
   RecordingRun run;
 };
 
@@ -39,8 +43,9 @@ std::nullopt_t refuse(std::string_view why) {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> out, seconds, seed, speed, service;
+  std::optional<std::string_view> out, to, seconds, seed, speed, service;
   const platform::CommandLineOption table[] = {
+      {"--to", &to, "a format: pcapng, jsonl or csv"},
       {"--seconds", &seconds},
       {"--seed", &seed},
       {"--speed", &speed},
@@ -53,7 +58,13 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
     return refuse(error);
   }
 
-  Options options{.outPath = std::string(*out), .run = {}};
+  Options options{.outPath = std::string(*out), .format = nullptr, .run = {}};
+  if (to) {
+    options.format = exporting::exportFormatNamed(*to);
+    if (options.format == nullptr) return refuse("--to wants pcapng, jsonl or csv");
+    if (options.format->writesFolder && *out == "-")
+      return refuse("--to " + std::string(*to) + " writes one file per record kind: give a folder");
+  }
   if (seconds) {
     const auto whole = platform::parseNumber<std::uint32_t>(*seconds);
     if (!whole || *whole == 0) return refuse("--seconds wants a whole number above 0");
@@ -79,6 +90,28 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
   return options;
 }
 
+int recordExport(const Options& options, const std::string& configuration) {
+  std::string error;
+  const std::unique_ptr<exporting::MetricExport> out =
+      options.format->open(options.outPath, {.raw = false, .live = true}, error);
+  if (!out) {
+    std::cerr << "norvo record: " << error << '\n';
+    return 1;
+  }
+  const auto exporter = std::make_shared<MetricExporter>(*out);
+  const bool subscribed = runRecordingSession(options.run, configuration, exporter);
+  const bool finished = out->finish(error);
+  if (!subscribed) {
+    std::cerr << "norvo record: the service refused the metric configuration\n";
+    return 1;
+  }
+  if (exporter->failed() || !finished) {
+    std::cerr << "norvo record: " << (error.empty() ? "cannot write the output" : error) << '\n';
+    return 1;
+  }
+  return 0;
+}
+
 }  // namespace
 
 void MetricRecorder::metricsDidUpdate(const platform::Dictionary& metric) {
@@ -86,6 +119,19 @@ void MetricRecorder::metricsDidUpdate(const platform::Dictionary& metric) {
       std::chrono::steady_clock::now() - began_);
   writer_.write(metric, sinceStart.count());
   if (next_ != nullptr) next_->metricsDidUpdate(metric);
+}
+
+void MetricExporter::metricsDidUpdate(const platform::Dictionary& metric) {
+  if (failed_) return;
+  const auto sinceStart = std::chrono::duration_cast<std::chrono::milliseconds>(
+      std::chrono::steady_clock::now() - began_);
+  const auto exported = times_.metricOf(metric, sinceStart.count());
+  // The service delivers only metrics with an ID and a payload.
+  if (const auto* ready = std::get_if<exporting::ExportedMetric>(&exported);
+      ready != nullptr && !out_.write(*ready)) {
+    failed_ = true;
+    platform::stopMainQueue();
+  }
 }
 
 bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
@@ -139,6 +185,7 @@ int runRecordCommand(std::span<const std::string_view> arguments) {
     std::cerr << "norvo record: cannot find the metric configuration among the resources\n";
     return 1;
   }
+  if (options->format != nullptr) return recordExport(*options, *configuration);
   std::ofstream out(options->outPath, std::ios::binary | std::ios::trunc);
   if (!out) {
     std::cerr << "norvo record: cannot write " << options->outPath << '\n';

@@ -11,12 +11,14 @@
 
 #include "app/ServiceOption.h"
 #include "client/TarnWrapperDelegate.h"
+#include "export/MetricExport.h"
 #include "tarn/log/MetricLog.h"
 
 namespace app {
 
-// `norvo record OUT.jsonl [--seconds N] [--seed S] [--speed X] [--service WHERE]`: records what
-// the baseband service delivers to the app into a metric log. Answers the exit status.
+// `norvo record OUT.jsonl [--to FORMAT] [--seconds N] [--seed S] [--speed X] [--service WHERE]`:
+// records what the baseband service delivers to the app into a metric log, or live into an
+// export format (`--to pcapng -` for Wireshark). Answers the exit status.
 int runRecordCommand(std::span<const std::string_view> arguments);
 
 // Writes each metric it receives to a metric log, with "t_ms" counted from its construction, and
@@ -33,6 +35,23 @@ class MetricRecorder final : public TarnWrapperDelegate {
   const std::chrono::steady_clock::time_point began_ = std::chrono::steady_clock::now();
   tarn::log::MetricLogWriter writer_;
   TarnWrapperDelegate* next_;
+};
+
+// Hands each metric it receives to an export as it comes, with "t_ms" counted from its
+// construction, and stops the main queue when the export's output fails (a reader that went away).
+class MetricExporter final : public TarnWrapperDelegate {
+ public:
+  explicit MetricExporter(exporting::MetricExport& out) : out_(out) {}
+
+  void metricsDidUpdate(const platform::Dictionary& metric) override;
+  void eventsDidUpdate(const platform::Dictionary&) override {}
+  bool failed() const { return failed_; }
+
+ private:
+  const std::chrono::steady_clock::time_point began_ = std::chrono::steady_clock::now();
+  exporting::MetricExport& out_;
+  exporting::MetricTimes times_;
+  bool failed_ = false;
 };
 
 struct RecordingRun {

@@ -3,6 +3,7 @@
 #include <string_view>
 #include <vector>
 
+#include "app/ExportCommand.h"
 #include "app/IntakeCommand.h"
 #include "app/RecordCommand.h"
 #include "app/Viewer.h"
@@ -15,6 +16,7 @@ struct Command {
 };
 
 constexpr Command kCommands[] = {
+    {"export", &app::runExportCommand},
     {"intake", &app::runIntakeCommand},
     {"record", &app::runRecordCommand},
 };
@@ -24,10 +26,13 @@ constexpr std::string_view kCommandsUsage =
     "usage: norvo <command> [arguments]\n"
     "\n"
     "commands:\n"
+    "  export LOG.jsonl --to pcapng|jsonl|csv [-o OUT] [--raw]\n"
+    "      Write a metric log out for Wireshark, jq and pandas, or spreadsheets.\n"
     "  intake LOG.jsonl [--dump-store OUT.json]\n"
     "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
-    "  record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"
-    "      Record the metrics the simulated phone delivers into a metric log, for --replay.\n"
+    "  record OUT.jsonl [--to FORMAT] [--seconds N] [--seed S] [--speed X]\n"
+    "      Record the metrics the simulated phone delivers into a metric log, for --replay,\n"
+    "      or live as an export: norvo record --to pcapng - | wireshark -k -i -\n"
     "\n"
     "norvo <command> --help describes a command.\n";
 

@@ -51,20 +51,31 @@ std::optional<Bytes> base64Decode(std::string_view text) {
   if (!text.empty() && text.back() == '=') padding = text[text.size() - 2] == '=' ? 2 : 1;
   const std::size_t symbols = text.size() - padding;
 
-  Bytes bytes;
-  bytes.reserve(text.size() / 4 * 3);
+  // Whole groups of four symbols make three bytes; a last group of two or three makes one or
+  // two, its spare low bits dropped.
+  Bytes bytes(symbols * 6 / 8);
+  const auto sextet = [&text](std::size_t i) -> std::uint32_t {
+    return kSextets[static_cast<unsigned char>(text[i])];
+  };
+  std::size_t i = 0;
+  std::size_t out = 0;
+  for (; i + 4 <= symbols; i += 4) {
+    const std::uint32_t a = sextet(i), b = sextet(i + 1), c = sextet(i + 2), d = sextet(i + 3);
+    if (((a | b | c | d) & ~0x3Fu) != 0) return std::nullopt;
+    const std::uint32_t group = a << 18 | b << 12 | c << 6 | d;
+    bytes[out++] = static_cast<std::uint8_t>(group >> 16);
+    bytes[out++] = static_cast<std::uint8_t>(group >> 8);
+    bytes[out++] = static_cast<std::uint8_t>(group);
+  }
   std::uint32_t group = 0;
-  int bits = 0;
-  for (std::size_t i = 0; i < symbols; ++i) {
-    const std::uint8_t sextet = kSextets[static_cast<unsigned char>(text[i])];
-    if (sextet == kNotInAlphabet) return std::nullopt;
-    group = group << 6 | sextet;
-    bits += 6;
-    if (bits >= 8) {
-      bits -= 8;
-      bytes.push_back(static_cast<std::uint8_t>(group >> bits));
-      group &= (1u << bits) - 1;
-    }
+  for (std::size_t rest = i; rest < symbols; ++rest) {
+    if ((sextet(rest) & ~0x3Fu) != 0) return std::nullopt;
+    group = group << 6 | sextet(rest);
+  }
+  if (symbols - i == 2) bytes[out] = static_cast<std::uint8_t>(group >> 4);
+  if (symbols - i == 3) {
+    bytes[out] = static_cast<std::uint8_t>(group >> 10);
+    bytes[out + 1] = static_cast<std::uint8_t>(group >> 2);
   }
   return bytes;
 }

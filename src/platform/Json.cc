@@ -14,9 +14,21 @@ constexpr std::string_view kReplacementCharacter = "\xEF\xBF\xBD";
 
 void appendValue(std::string& out, const Value& value);
 
+// Printable ASCII other than the quote and the backslash goes out as it is.
+bool isPlainAscii(char c) {
+  const auto byte = static_cast<unsigned char>(c);
+  return byte >= 0x20 && byte < 0x80 && c != '"' && c != '\\';
+}
+
 void appendString(std::string& out, std::string_view text) {
   out += '"';
   while (!text.empty()) {
+    std::size_t plain = 0;
+    while (plain < text.size() && isPlainAscii(text[plain]))
+      ++plain;
+    out.append(text.substr(0, plain));
+    text.remove_prefix(plain);
+    if (text.empty()) break;
     const char c = text.front();
     if (c == '"' || c == '\\') {
       out += '\\';
@@ -91,6 +103,14 @@ void appendValue(std::string& out, const Value& value) {
 }
 
 }  // namespace
+
+void appendJson(std::string& out, const Value& value) {
+  appendValue(out, value);
+}
+
+void appendJson(std::string& out, const Dictionary& dictionary) {
+  appendDictionary(out, dictionary);
+}
 
 std::string toJson(const Value& value) {
   std::string out;

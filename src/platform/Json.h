@@ -13,5 +13,8 @@ namespace platform {
 std::string toJson(const Value& value);
 std::string toJson(const List& list);
 std::string toJson(const Dictionary& dictionary);
+// The same text, appended to `out`.
+void appendJson(std::string& out, const Value& value);
+void appendJson(std::string& out, const Dictionary& dictionary);
 
 }  // namespace platform

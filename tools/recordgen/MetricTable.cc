@@ -13,22 +13,20 @@
 #include "options.pb.h"
 
 namespace recordgen {
-namespace {
 
 using google::protobuf::FileDescriptor;
 
-struct Row {
-  std::uint32_t id;
-  std::string name;         // in the baseband's table of metric-ID tags
-  std::string recordClass;  // empty when no record carries the metric
-  bool tagListed;
-};
+std::string hex(std::uint32_t id) {
+  char text[16];
+  std::snprintf(text, sizeof text, "0x%06X", id);
+  return text;
+}
 
-std::vector<Row> metricRows(const std::vector<const FileDescriptor*>& files) {
-  std::vector<Row> rows;
+std::vector<MetricRow> metricRows(const std::vector<const FileDescriptor*>& files) {
+  std::vector<MetricRow> rows;
   for (const auto* file : files) {
     for (const auto& metric : file->options().GetRepeatedExtension(norvo::recordless_metric))
-      rows.push_back({metric.id(), metric.name(), "", true});
+      rows.push_back({metric.id(), metric.name(), "", "", true});
     for (int i = 0; i < file->message_type_count(); ++i) {
       const auto& options = file->message_type(i)->options();
       if (!options.HasExtension(norvo::metric_id)) continue;
@@ -37,11 +35,12 @@ std::vector<Row> metricRows(const std::vector<const FileDescriptor*>& files) {
                       options.HasExtension(norvo::metric_name)
                           ? options.GetExtension(norvo::metric_name)
                           : recordClass,
-                      recordClass, options.GetExtension(norvo::metric_id_tag)});
+                      recordClass, file->message_type(i)->full_name(),
+                      options.GetExtension(norvo::metric_id_tag)});
     }
   }
   std::set<std::uint32_t> ids;
-  for (const Row& row : rows) {
+  for (const MetricRow& row : rows) {
     if ((row.id >> 16) != 0x3C)
       throw std::runtime_error(row.name + ": a metric ID has 0x3C in bits 16 to 23");
     if (!ids.insert(row.id).second)
@@ -50,17 +49,9 @@ std::vector<Row> metricRows(const std::vector<const FileDescriptor*>& files) {
   return rows;
 }
 
-std::string hex(std::uint32_t id) {
-  char text[16];
-  std::snprintf(text, sizeof text, "0x%06X", id);
-  return text;
-}
-
-}  // namespace
-
 void writeMetricTable(const std::vector<const FileDescriptor*>& files,
                       google::protobuf::compiler::GeneratorContext& context) {
-  const std::vector<Row> rows = metricRows(files);
+  const std::vector<MetricRow> rows = metricRows(files);
   std::unique_ptr<google::protobuf::io::ZeroCopyOutputStream> out(context.Open("Metrics.h"));
   google::protobuf::io::Printer p(out.get(), '$');
   p.Print(
@@ -71,14 +62,14 @@ void writeMetricTable(const std::vector<const FileDescriptor*>& files,
       "#include <cstdint>\n\n"
       "#include \"messages/MetricKind.h\"\n\n"
       "namespace messages {\n\n");
-  for (const Row& row : rows) {
+  for (const MetricRow& row : rows) {
     if (!row.recordClass.empty()) p.Print("class $Class$;\n", "Class", row.recordClass);
   }
   p.Print(
       "\n// Every metric, in schema order.\ninline constexpr std::array<MetricKind, $n$> "
       "kMetricKinds{{\n",
       "n", std::to_string(rows.size()));
-  for (const Row& row : rows) {
+  for (const MetricRow& row : rows) {
     p.Print("    {$id$, \"$name$\", \"$Class$\", $tag$},\n", "id", hex(row.id), "name", row.name,
             "Class", row.recordClass, "tag", row.tagListed ? "true" : "false");
   }
@@ -86,7 +77,7 @@ void writeMetricTable(const std::vector<const FileDescriptor*>& files,
       "}};\n\n"
       "// Each metric's ID, named by its record class (or, with no record, by its own name).\n"
       "namespace metric {\n");
-  for (const Row& row : rows) {
+  for (const MetricRow& row : rows) {
     p.Print("inline constexpr std::uint32_t $Name$ = $id$;\n", "Name",
             row.recordClass.empty() ? row.name : row.recordClass, "id", hex(row.id));
   }
@@ -95,7 +86,7 @@ void writeMetricTable(const std::vector<const FileDescriptor*>& files,
       "// The metric ID of the metric a record class carries.\n"
       "template <class Record>\n"
       "struct MetricOf;\n");
-  for (const Row& row : rows) {
+  for (const MetricRow& row : rows) {
     if (row.recordClass.empty()) continue;
     p.Print(
         "template <>\n"

@@ -6,9 +6,11 @@
 #include <memory>
 #include <stdexcept>
 
+#include "FieldTable.h"
 #include "MetricTable.h"
 #include "Naming.h"
 #include "RecordEmitter.h"
+#include "WiresharkTable.h"
 
 namespace recordgen {
 namespace {
@@ -207,12 +209,18 @@ bool RecordGenerator::GenerateAll(const std::vector<const FileDescriptor*>& file
                                   std::string* error) const {
   std::vector<const FileDescriptor*> schemas;
   for (const auto* file : files) {
-    if (declaresOptions(*file)) continue;
-    if (!Generate(file, parameter, context, error)) return false;
-    schemas.push_back(file);
+    if (!declaresOptions(*file)) schemas.push_back(file);
   }
   try {
+    if (parameter == "wireshark") {
+      writeWiresharkTable(schemas, *context);
+      return true;
+    }
+    for (const auto* file : schemas) {
+      if (!Generate(file, parameter, context, error)) return false;
+    }
     writeRegistry(schemas, *context);
+    writeFieldTable(schemas, *context);
     writeMetricTable(schemas, *context);
     return true;
   } catch (const std::exception& failure) {

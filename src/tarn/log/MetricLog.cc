@@ -1,6 +1,7 @@
 #include "tarn/log/MetricLog.h"
 
 #include <algorithm>
+#include <boost/json/monotonic_resource.hpp>
 #include <boost/json/parse.hpp>
 #include <boost/json/value.hpp>
 
@@ -58,12 +59,17 @@ bool isBlank(std::string_view line) {
 }  // namespace
 
 ParsedLine parseMetricLogLine(std::string_view line) {
+  // A line's values live only until the record is made: they take their memory from the
+  // stack, and from the heap only for a long line.
+  unsigned char scratch[4096];
+  boost::json::monotonic_resource memory(scratch, sizeof scratch);
   boost::system::error_code error;
-  const boost::json::value json = boost::json::parse(line, error);
+  const boost::json::value json = boost::json::parse(line, error, &memory);
   if (error) return failure("not JSON (" + error.message() + ")");
   if (!json.is_object()) return failure("not a JSON object");
 
   MetricLogEntry entry;
+  entry.record.reserve(json.get_object().size());
   for (const auto& member : json.get_object()) {
     const std::string_view key = member.key();
     const boost::json::value& value = member.value();
@@ -106,7 +112,7 @@ std::optional<std::string> formatMetricLogLine(const platform::Dictionary& recor
 }
 
 std::optional<MetricLogReader::Line> MetricLogReader::next() {
-  std::string text;
+  std::string& text = line_;
   while (std::getline(input_, text)) {
     ++lineNumber_;
     if (isBlank(text)) continue;

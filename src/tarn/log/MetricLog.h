@@ -58,6 +58,7 @@ class MetricLogReader {
  private:
   std::istream& input_;
   std::size_t lineNumber_ = 0;
+  std::string line_;  // kept, so that its memory serves the next line
 };
 
 class MetricLogWriter {

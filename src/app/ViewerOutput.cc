@@ -53,6 +53,10 @@ ViewerOutput::~ViewerOutput() {
   }
 }
 
+void ViewerOutput::setAlertCount(std::function<std::size_t()> count) {
+  if (statusLine_) statusLine_->setAlertCount(std::move(count));
+}
+
 void ViewerOutput::wire(ui::DisplayOptions& display, store::MetricValidator& intake) {
   if (!statusLine_) return;
   StatusLine& statusLine = *statusLine_;

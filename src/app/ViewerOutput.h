@@ -1,6 +1,8 @@
 #pragma once
 
+#include <chrono>
 #include <cstdio>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -33,6 +35,8 @@ class ViewerOutput {
   // The status line learns the address once the pages are served, and counts the metrics the
   // intake stores.
   void wire(ui::DisplayOptions& display, store::MetricValidator& intake);
+  // Where the status line takes the number of alerts from, once alerts exist.
+  void setAlertCount(std::function<std::size_t()> count);
 
  private:
   ViewerOutput(std::FILE* logFile, std::unique_ptr<StatusLine> statusLine);

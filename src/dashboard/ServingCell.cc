@@ -236,8 +236,9 @@ List carriersOf(const store::MetricValidator& intake) {
       const Value* value = carrier->find(key);
       shown.append(std::string(key), value != nullptr ? *value : Value());
     }
+    constexpr std::string_view kStatePrefix = "SCC_STATE_";
     auto state = textIn(*carrier, "state");
-    if (state && state->starts_with("SCC_STATE_")) state->erase(0, 10);
+    if (state && state->starts_with(kStatePrefix)) state->erase(0, kStatePrefix.size());
     shown.append("state", state ? Value(*state) : Value());
     const auto earfcn = numberIn(*carrier, "dl_earfcn");
     shown.append("earfcn", earfcn ? Value(*earfcn) : Value());

@@ -7,8 +7,10 @@
 #include <string>
 
 #include "app/AppDelegate.h"
+#include "app/Dashboard.h"
 #include "app/MainInterface.h"
 #include "app/ServiceOption.h"
+#include "app/ViewerOutput.h"
 #include "platform/CommandLine.h"
 #include "platform/Json.h"
 #include "platform/ParseNumber.h"
@@ -24,7 +26,7 @@
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT] [--service WHERE]\n"
+    "usage: norvo [--listen ADDR:PORT] [--service WHERE] [--log FILE]\n"
     "             [--replay LOG.jsonl [--speed X] [--loop]]\n"
     "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
@@ -50,11 +52,15 @@ const std::string_view kViewerUsage =
     "                      first modem, or the one of this D-Bus path, index or IMEI\n"
     "                      (docs/modemmanager.md)\n"
     "  --refresh SECONDS   how often to read the modem's signal and cells, 1 to 5 (default 2)\n"
+    "  --log FILE          write the log lines to FILE; \"-\" writes them to standard output.\n"
+    "                      On a terminal, Norvo shows one status line instead, and the lines\n"
+    "                      go to $XDG_STATE_HOME/norvo/norvo.log (~/.local/state/norvo/)\n"
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
     "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON and\n"
-    "/api/store answers the whole store.\n";
+    "/api/store answers the whole store. /dashboard graphs the levels and shows the serving\n"
+    "cell; /api/series answers the graphs' series and /api/dashboard the serving cell.\n";
 
 namespace {
 
@@ -64,6 +70,7 @@ struct ViewerOptions {
   std::optional<std::string> replayPath;
   tarn::replay::ReplayOptions replay;
   std::optional<tarn::mm::ModemManagerOptions> modem;
+  std::optional<std::string_view> log;
 };
 
 std::nullopt_t refuse(std::string_view why) {
@@ -73,7 +80,7 @@ std::nullopt_t refuse(std::string_view why) {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> listen, service, replay, speed, source, refresh;
+  std::optional<std::string_view> listen, service, replay, speed, source, refresh, log;
   bool loop = false;
   const platform::CommandLineOption table[] = {
       {"--listen", &listen, "an address and a port"},
@@ -83,6 +90,7 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       {"--loop", &loop},
       {"--source", &source},
       {"--refresh", &refresh},
+      {"--log", &log, "a file name, or - for standard output"},
   };
   if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
     std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
@@ -131,6 +139,7 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
     if (!seconds) return refuse(tarn::mm::kRefreshWanted);
     options.modem->refresh = *seconds;
   }
+  options.log = log;
   return options;
 }
 
@@ -148,6 +157,13 @@ std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& 
   // The same drive every run, so that what one user sees another can reproduce.
   constexpr std::uint64_t kDriveSeed = 1;
   return std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed);
+}
+
+// The status line's name for where the metrics come from.
+std::string sourceName(const ViewerOptions& options) {
+  if (options.service.bus) return "tarnd on D-Bus";
+  if (options.replayPath) return "replay of " + *options.replayPath;
+  return "simulated phone";
 }
 
 }  // namespace
@@ -171,10 +187,17 @@ int runViewer(std::span<const std::string_view> arguments) {
   }
   useService(options->service, std::move(source));
 
+  const std::unique_ptr<ViewerOutput> output =
+      ViewerOutput::open(options->log, sourceName(*options), viewerSeries());
+  if (!output) return 1;
+
   ui::DisplayOptions display = std::move(options->display);
   display.readings.emplace("store", [] {
     return platform::toJson(store::dumpStore(store::MetricValidator::sharedInstance()));
   });
+  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
+  addDashboard(display, intake, viewerSeries());
+  output->wire(display, intake);
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

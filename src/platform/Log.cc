@@ -12,10 +12,17 @@ namespace platform::log {
 
 namespace {
 
+bool isTerminal(std::FILE* output) {
+  return isatty(fileno(output)) == 1;
+}
+
 struct Channels {
   std::mutex mutex;
   std::vector<Capture*> captures;  // the innermost last
   bool systemLogOpen = false;
+  std::FILE* plainOutput = stdout;
+  bool plainInteractive = isTerminal(stdout);
+  bool plainUnflushed = false;
 
   static Channels& instance() {
     // Never destroyed, so that lines written while other static objects are destroyed
@@ -25,16 +32,15 @@ struct Channels {
   }
 };
 
-void writeToStandardOutput(std::string_view line) {
-  // A terminal shows each line at once; a pipe or file keeps stdio's buffering, which exit()
-  // flushes.
-  static const bool interactive = isatty(STDOUT_FILENO) == 1;
-  // Holding the stream keeps the line whole even next to other writers of standard output.
-  flockfile(stdout);
-  std::fwrite(line.data(), 1, line.size(), stdout);
-  std::fputc('\n', stdout);
-  if (interactive) std::fflush(stdout);
-  funlockfile(stdout);
+void writeToPlainOutput(Channels& channels, std::string_view line) {
+  std::FILE* output = channels.plainOutput;
+  // Holding the stream keeps the line whole even next to other writers of the same stream.
+  flockfile(output);
+  std::fwrite(line.data(), 1, line.size(), output);
+  std::fputc('\n', output);
+  if (channels.plainInteractive) std::fflush(output);
+  funlockfile(output);
+  channels.plainUnflushed = !channels.plainInteractive;
 }
 
 void writeToSystemLog(Channels& channels, std::string_view line) {
@@ -52,7 +58,7 @@ void plain(std::string_view line) {
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.captures.empty()) {
-    writeToStandardOutput(line);
+    writeToPlainOutput(channels, line);
   } else {
     channels.captures.back()->plainLines_.emplace_back(line);
   }
@@ -66,6 +72,23 @@ void system(std::string_view line) {
   } else {
     channels.captures.back()->systemLines_.emplace_back(line);
   }
+}
+
+void setPlainOutput(std::FILE* output) {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (channels.plainUnflushed) std::fflush(channels.plainOutput);
+  channels.plainOutput = output;
+  channels.plainInteractive = isTerminal(output);
+  channels.plainUnflushed = false;
+}
+
+void flushPlain() {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (!channels.plainUnflushed) return;
+  std::fflush(channels.plainOutput);
+  channels.plainUnflushed = false;
 }
 
 Capture::Capture() {

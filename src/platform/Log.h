@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdio>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -23,6 +24,13 @@ template <class... Args>
 void systemf(std::string_view pattern, const Args&... arguments) {
   system(format(pattern, arguments...));
 }
+
+// Where plain lines go while no Capture is alive: standard output unless told otherwise; the
+// caller keeps `output` open from then on. A terminal gets each line at once; a file or a pipe
+// gets stdio's buffering, which flushPlain() (or exit) writes out.
+void setPlainOutput(std::FILE* output);
+// Writes out the plain lines still held in the output's buffer; cheap when there are none.
+void flushPlain();
 
 // While a Capture is alive, the lines of both channels go to it instead of to standard output
 // and the system log. Captures nest: the most recent one alive receives the lines.

@@ -1,5 +1,6 @@
 #include "platform/Log.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -104,6 +105,36 @@ TEST(ThePlainLog, WritesLinesToAPipedStandardOutputByTheTimeTheProcessExits) {
     plainf("Metric ID in Hex = %X", 0x3CD30E);
   });
   EXPECT_EQ(output, "pushing metric file\nMetric ID in Hex = 3CD30E\n");
+}
+
+// What the pipe holds now, without waiting.
+std::string readAvailable(int readEnd) {
+  std::string text;
+  char buffer[256];
+  for (ssize_t n; (n = read(readEnd, buffer, sizeof buffer)) > 0;)
+    text.append(buffer, static_cast<std::size_t>(n));
+  return text;
+}
+
+TEST(ThePlainLog, HoldsLinesForAPipeUntilItIsFlushedAndCanBeSentElsewhere) {
+  int pipeEnds[2];
+  ASSERT_EQ(pipe2(pipeEnds, O_NONBLOCK), 0);
+  std::FILE* output = fdopen(pipeEnds[1], "w");
+  ASSERT_NE(output, nullptr);
+  setPlainOutput(output);
+  plain("pushing metric file");
+  plain("Received Valid Metric");
+  EXPECT_EQ(readAvailable(pipeEnds[0]), "");
+  flushPlain();
+  EXPECT_EQ(readAvailable(pipeEnds[0]), "pushing metric file\nReceived Valid Metric\n");
+  flushPlain();
+  EXPECT_EQ(readAvailable(pipeEnds[0]), "");
+
+  plain("Querying SIM files");
+  setPlainOutput(stdout);  // writes out what the old output holds
+  EXPECT_EQ(readAvailable(pipeEnds[0]), "Querying SIM files\n");
+  std::fclose(output);
+  close(pipeEnds[0]);
 }
 
 TEST(TheSystemLog, StaysOffStandardOutput) {

@@ -1,0 +1,210 @@
+#include "dashboard/ServingCell.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <map>
+#include <memory>
+
+#include "messages/Records.h"
+#include "radio/Iccid.h"
+#include "radio/Imsi.h"
+#include "store/StoreTesting.h"
+
+namespace dashboard {
+namespace {
+
+using namespace messages;
+using platform::Dictionary;
+using platform::Value;
+using V = store::MetricValidator;
+
+class ServingCellTest : public store::fixtures::StoreTest {
+ protected:
+  ServingCellTest() {
+    validator.addStoreObserver([this](store::DisplayDictionary replaced, const V& intake) {
+      series.storeDidUpdate(replaced, intake);
+    });
+  }
+
+  // The card's rows as label to value.
+  std::map<std::string, std::string> rows() const {
+    std::map<std::string, std::string> shown;
+    const Dictionary card = dashboardCard(validator, series);
+    for (const Value& row : *card.find("rows")->asList()) {
+      const Dictionary& entry = *row.asDictionary();
+      shown[*entry.find("label")->asString()] = *entry.find("value")->asString();
+    }
+    return shown;
+  }
+
+  void lteCell(std::uint32_t earfcn) {
+    KCellularLteRrcState state;
+    state.setState(KCellularLteRrcState::KLTE_RRC_STATE_CONNECTED);
+    deliver(V::K_LTE_RRC_STATE, state);
+    KCellularLteScellInfo cell;
+    cell.setPhyCellId(301);
+    cell.setDlFreq(earfcn);
+    cell.setCellId(0x1234567);
+    cell.setTrackingAreaCode(4660);
+    cell.setSelPlmnMcc(1);
+    cell.setSelPlmnMnc(1);
+    cell.setNumMncDigits(2);
+    deliver(V::K_LTE_SCELL_INFO, cell);
+    KCellularLteRsrpRsrqSinr levels;
+    auto sample = std::make_shared<RsrpRsrqSinr>();
+    sample->setRsrp0(-95);
+    sample->setRsrq0(-8);
+    sample->setSinr0(50);
+    levels.addInstValues(sample);
+    deliver(V::K_LTE_RSRP_RSRQ_SINR, levels);
+  }
+
+  void gsmCell(std::uint32_t arfcn, std::optional<SysBand> band) {
+    KCellularGsmScellInfo cell;
+    cell.setMcc(310);
+    cell.setMnc(260);
+    cell.setNumMncDigits(3);
+    cell.setLac(1001);
+    cell.setCellId(5021);
+    cell.setArfcn(arfcn);
+    cell.setBsic(23);
+    if (band) cell.setGsmBand(*band);
+    deliver(V::K_GSM_SCELL_INFO, cell);
+    KCellularGsmIdleScellMeasurement level;
+    level.setIdleRxlevDBm(-104);
+    deliver(V::K_GSM_IDLE_SCELL_MEAS, level);
+  }
+
+  std::int64_t clock = 1'700'000'000'000;
+  series::SeriesStore series{[this] { return clock; }, 16};
+};
+
+TEST_F(ServingCellTest, ShowsTheLteCellWithItsBandFrequenciesAndColouredLevels) {
+  lteCell(1300);
+  EXPECT_EQ(rows(), (std::map<std::string, std::string>{{"Technology", "LTE"},
+                                                        {"RRC state", "CONNECTED"},
+                                                        {"Operator", "001-01"},
+                                                        {"Cell ID", "19088743"},
+                                                        {"eNB", "74565"},
+                                                        {"Sector", "103"},
+                                                        {"PCI", "301"},
+                                                        {"EARFCN", "1300"},
+                                                        {"Band", "3"},
+                                                        {"Downlink", "1815.0 MHz"},
+                                                        {"Uplink", "1720.0 MHz"},
+                                                        {"TAC", "4660"}}));
+  const Dictionary card = dashboardCard(validator, series);
+  EXPECT_EQ(*card.find("technology"), Value("LTE"));
+  const platform::List levels = *card.find("levels")->asList();
+  ASSERT_EQ(levels.size(), 3u);  // no transmit power yet
+  EXPECT_EQ(levels[0], (Value(Dictionary{{"name", "lte.rsrp"},
+                                         {"label", "RSRP"},
+                                         {"value", -95.0},
+                                         {"unit", "dBm"},
+                                         {"quality", "fair"}})));
+  EXPECT_EQ(*levels[1].asDictionary()->find("quality"), Value("excellent"));  // RSRQ -8
+  EXPECT_EQ(*levels[2].asDictionary()->find("quality"), Value("excellent"));  // SINR 25
+}
+
+TEST_F(ServingCellTest, ShowsANumberNoBandHoldsAsItIsWithoutAGuess) {
+  struct Case {
+    std::uint32_t arfcn;
+    std::optional<SysBand> band;
+    std::optional<std::string> bandName, downlink;
+  };
+  const Case cases[] = {
+      {600, SYS_BAND_GSM_DCS_1800, "DCS 1800", "1822.8 MHz"},
+      {600, SYS_BAND_GSM_PCS_1900, "PCS 1900", "1947.8 MHz"},
+      {600, std::nullopt, std::nullopt, std::nullopt},  // DCS or PCS: no guess
+      {62, SYS_BAND_GSM_PGSM_900, "P-GSM 900", "947.4 MHz"},
+      {2000, SYS_BAND_GSM_PGSM_900, std::nullopt, std::nullopt},
+  };
+  for (const Case& c : cases) {
+    gsmCell(c.arfcn, c.band);
+    const auto shown = rows();
+    EXPECT_EQ(shown.at("Technology"), "GSM");
+    EXPECT_EQ(shown.at("Operator"), "310-260");
+    EXPECT_EQ(shown.at("ARFCN"), std::to_string(c.arfcn));
+    EXPECT_EQ(shown.contains("Band") ? std::optional(shown.at("Band")) : std::nullopt, c.bandName)
+        << c.arfcn;
+    EXPECT_EQ(shown.contains("Downlink") ? std::optional(shown.at("Downlink")) : std::nullopt,
+              c.downlink)
+        << c.arfcn;
+    clock += 1000;
+  }
+}
+
+TEST_F(ServingCellTest, FollowsTheTechnologyWhoseLevelCameLastUntilItStops) {
+  lteCell(1300);
+  clock += 500;
+  gsmCell(62, SYS_BAND_GSM_PGSM_900);
+  EXPECT_EQ(servingLevel(series)->technology, "GSM");
+  EXPECT_EQ(servingLevel(series)->sample.value, -104);
+  clock += 500;
+  lteCell(1300);
+  EXPECT_EQ(servingLevel(series)->technology, "LTE");
+
+  clock += kServingLevelStaleMs + 1;
+  EXPECT_FALSE(servingLevel(series));
+  const Dictionary card = dashboardCard(validator, series);
+  EXPECT_TRUE(card.find("technology")->isNull());
+  EXPECT_TRUE(card.find("rows")->asList()->empty());
+}
+
+TEST_F(ServingCellTest, ShowsTheCarriersAndTheSubscriberFromTheSimFiles) {
+  KCellularLteCarrierAggregationStatus status;
+  auto carrier = std::make_shared<SecondaryComponentCarrier>();
+  carrier->setIndex(1);
+  carrier->setState(SecondaryComponentCarrier::SCC_STATE_ACTIVATED);
+  carrier->setPci(17);
+  carrier->setDlEarfcn(3050);
+  carrier->setDlBandwidth(2);
+  carrier->setRsrp(-10512);
+  carrier->setRsrq(-1175);
+  status.addSccList(carrier);
+  deliver(V::K_LTE_CA_STATUS, status);
+
+  KCellularSimCardFiles sim;
+  const auto file = [&sim](std::uint32_t id, platform::Bytes content) {
+    auto ef = std::make_shared<ElementaryFile>();
+    ef->setEfId(id);
+    ef->setContent(std::move(content));
+    sim.addEfList(ef);
+  };
+  file(0x2FE2, *radio::encodeEfIccid("8949001234567890123"));
+  file(0x6F07, *radio::encodeEfImsi("001010123456789"));
+  file(0x6F46, {0x01, 'T', 'e', 's', 't', ' ', 'N', 'e', 't', 0xFF, 0xFF});
+  file(0x6FAD, {0x00, 0x00, 0x00, 0x02});
+  deliver(V::K_SIM_FILE_INFO, sim);
+
+  const Dictionary card = dashboardCard(validator, series);
+  EXPECT_EQ(*card.find("carriers"), Value(platform::List{Dictionary{{"index", 1u},
+                                                                    {"pci", 17u},
+                                                                    {"rsrp", std::int64_t{-105}},
+                                                                    {"rsrq", -11.75F},
+                                                                    {"state", "ACTIVATED"},
+                                                                    {"earfcn", 3050u},
+                                                                    {"band", "7"},
+                                                                    {"downlink", "2650.0 MHz"},
+                                                                    {"bandwidth", "5.0 MHz"}}}));
+  EXPECT_EQ(*card.find("subscriber"), Value(Dictionary{{"imsi", "001010123456789"},
+                                                       {"mcc", "001"},
+                                                       {"mnc", "01"},
+                                                       {"msin", "0123456789"},
+                                                       {"iccid", "8949001234567890123"}}));
+  lteCell(1300);
+  EXPECT_EQ(rows().at("Network"), "Test Net");
+}
+
+TEST_F(ServingCellTest, ShowsNothingBeforeTheFirstMetrics) {
+  const Dictionary card = dashboardCard(validator, series);
+  EXPECT_EQ(card, (Dictionary{{"technology", Value()},
+                              {"rows", platform::List{}},
+                              {"levels", platform::List{}},
+                              {"carriers", platform::List{}},
+                              {"subscriber", Value()}}));
+}
+
+}  // namespace
+}  // namespace dashboard

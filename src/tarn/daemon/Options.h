@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <span>
@@ -7,6 +8,7 @@
 #include <string_view>
 #include <variant>
 
+#include "tarn/mqtt/BrokerAddress.h"
 #include "tarn/replay/ReplaySource.h"
 
 namespace tarn::daemon {
@@ -21,10 +23,26 @@ struct ReplayChoice {
   replay::ReplayOptions options;
 };
 
+// Where and how to publish the metrics over MQTT.
+struct PublishChoice {
+  // Its path is the topic prefix.
+  mqtt::BrokerAddress broker;
+  std::optional<std::string> caFile;
+  // Empty: the host name.
+  std::optional<std::string> device;
+  int qos = 1;
+  // Ten minutes of the simulated phone's metrics, which reports about 5.5 a second.
+  std::size_t queueLimit = 4000;
+};
+
+// The --bus value of a tarnd that only publishes.
+constexpr std::string_view kNoBus = "none";
+
 struct DaemonOptions {
   std::variant<SimulatorChoice, ReplayChoice> source;
-  // "session", "system" or a D-Bus address.
+  // "session", "system", a D-Bus address, or "none" to serve no bus and only publish.
   std::string bus = "session";
+  std::optional<PublishChoice> publish;
   std::optional<std::string> recordPath;
   bool help = false;
 };

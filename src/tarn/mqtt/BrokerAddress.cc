@@ -24,6 +24,12 @@ std::string BrokerAddress::shown() const {
   return std::string(tls ? kMqttsScheme : kMqttScheme) + endpoint() + "/" + path;
 }
 
+std::string BrokerAddress::text() const {
+  std::string credentials;
+  if (user) credentials = *user + (password ? ":" + *password : "") + "@";
+  return std::string(tls ? kMqttsScheme : kMqttScheme) + credentials + endpoint() + "/" + path;
+}
+
 bool isTopicLevel(std::string_view level) {
   return !level.empty() && level.find_first_of(std::string_view("/+#\0", 4)) == level.npos;
 }

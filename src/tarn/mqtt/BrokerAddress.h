@@ -19,6 +19,8 @@ struct BrokerAddress {
 
   // mqtt://HOST:PORT/PATH, without the user and password, for messages.
   std::string shown() const;
+  // The whole address, user and password included, as parseBrokerAddress reads it.
+  std::string text() const;
   // HOST:PORT, with brackets around an IPv6 address.
   std::string endpoint() const;
 

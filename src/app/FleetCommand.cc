@@ -13,7 +13,6 @@
 #include "fleet/Fleet.h"
 #include "fleet/FleetSite.h"
 #include "platform/CommandLine.h"
-#include "platform/Log.h"
 #include "tarn/mqtt/Link.h"
 #include "ui/web/ListenAddress.h"
 #include "ui/web/Server.h"
@@ -126,8 +125,9 @@ int runFleet(std::span<const std::string_view> arguments) {
     return 1;
   }
 
-  platform::log::plain("Open " + ui::web::browserAddress(server.localEndpoint()) +
-                       "fleet in a browser; Ctrl-C stops.");
+  // Flushed, as scripts wait for it on a pipe.
+  std::cout << "Open " << ui::web::browserAddress(server.localEndpoint())
+            << "fleet in a browser; Ctrl-C stops." << std::endl;
   boost::asio::signal_set signals(context, SIGINT, SIGTERM);
   signals.async_wait([&](const boost::system::error_code& error, int) {
     if (error) return;

@@ -11,6 +11,7 @@
 #include "tarn/mqtt/MqttTransport.h"
 #include "tarn/mqtt/Publisher.h"
 #include "tarn/mqtt/PublishingSource.h"
+#include "tarn/testing/ScriptedMetricSource.h"
 
 namespace {
 
@@ -126,6 +127,51 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
   ASSERT_TRUE(eventually([&] { return transport->device().status().status == "offline"; }));
   EXPECT_EQ(log.count("norvo: fleet/car-3 is offline (source: sim, seed 3)"), 1u);
   tarn::client::useTransport(nullptr);
+}
+
+// The SIM files come once, at power-on: a viewer that comes later has them from the broker.
+TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
+  TemporaryFolder folder;
+  Broker broker(folder.path(), {});
+  const auto address = [&](const std::string& path) {
+    return *tarn::mqtt::parseBrokerAddress(broker.address(path)).address;
+  };
+  tarn::mqtt::Publisher publisher({.broker = address("fleet"),
+                                   .caFile = std::nullopt,
+                                   .device = "car-4",
+                                   .qos = 1,
+                                   .queueLimit = 100,
+                                   .source = "scripted",
+                                   .name = "tarnd"});
+  auto scripted = std::make_shared<tarn::testing::ScriptedMetricSource>();
+  tarn::mqtt::PublishingSource source(scripted, publisher, "fleet", "car-4");
+  source.start([](const tarn::service::Metric&) {});
+  scripted->emit(metric(kSimFiles, 1));
+  scripted->emit(metric(kRrcState, 2));
+  scripted->emit(metric(kSimFiles, 3));  // the newer one counts
+  scripted->flush();
+  ASSERT_TRUE(eventually([&] { return publisher.counts().sent == 3; }));
+
+  platform::log::Capture log;
+  tarn::client::useTransport(std::make_shared<tarn::mqtt::MqttTransport>(
+      tarn::mqtt::RemoteDevice{address("fleet/car-4"), std::nullopt, "norvo"}));
+  {
+    RecordingSession session;
+    ASSERT_EQ(session.configure("0x3C4E04\n"), tarn::CommandResult{});
+    const auto query = [&] {
+      return session.perform(tarn::kCommandQueryMetric,
+                             bustest::withAppId({bustest::entry(
+                                 tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+    };
+    ASSERT_TRUE(eventually([&] { return query() == tarn::CommandResult{}; }));
+    const std::vector<bustest::ReceivedEvent> events = session.waitFor(2);
+    ASSERT_GE(events.size(), 2u);
+    const tarn::ipc::Object& answer = events[1].record;
+    EXPECT_EQ(integerAt(answer, tarn::kKeyMetricID), kSimFiles);
+    EXPECT_EQ(*answer.find(tarn::kKeyPayload)->asBytes(), (platform::Bytes{0x08, 3}));
+  }
+  tarn::client::useTransport(nullptr);
+  source.stop();
 }
 
 }  // namespace

@@ -85,7 +85,8 @@ int main(int argc, char** argv) {
           .name = "norvo-fleet-sim",
       });
       device.source = std::make_shared<tarn::mqtt::PublishingSource>(
-          std::make_shared<tarn::sim::SimulatorSource>(n, *factor), *device.publisher, name);
+          std::make_shared<tarn::sim::SimulatorSource>(n, *factor), *device.publisher,
+          broker.address->path, name);
       device.source->start([](const tarn::service::Metric&) {});
     }
   } catch (const std::exception& error) {

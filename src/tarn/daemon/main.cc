@@ -185,7 +185,8 @@ int serve(const DaemonOptions& options, const sigset_t& shutdownSignals) {
                 << error.what() << '\n';
       return kExitFailure;
     }
-    source = std::make_shared<tarn::mqtt::PublishingSource>(std::move(source), *publisher, device);
+    source = std::make_shared<tarn::mqtt::PublishingSource>(std::move(source), *publisher,
+                                                            options.publish->broker.path, device);
   }
   // Opened once the bus is reached, so that a daemon that cannot start leaves an earlier recording
   // alone; two daemons recording to one file are kept apart by its lock.

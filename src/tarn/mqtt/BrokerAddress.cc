@@ -1,5 +1,7 @@
 #include "tarn/mqtt/BrokerAddress.h"
 
+#include <cstdio>
+
 #include "platform/ParseNumber.h"
 
 namespace tarn::mqtt {
@@ -94,6 +96,12 @@ ParsedBrokerAddress parseBrokerAddress(std::string_view text) {
 
 std::string metricsTopic(std::string_view prefix, std::string_view device) {
   return std::string(prefix) + "/" + std::string(device) + "/metrics";
+}
+
+std::string latestTopic(std::string_view prefix, std::string_view device, std::uint32_t metricId) {
+  char hex[16];
+  std::snprintf(hex, sizeof hex, "0x%X", metricId);
+  return std::string(prefix) + "/" + std::string(device) + "/latest/" + hex;
 }
 
 std::string statusTopic(std::string_view prefix, std::string_view device) {

@@ -46,5 +46,8 @@ bool isTopicLevel(std::string_view level);
 std::string metricsTopic(std::string_view prefix, std::string_view device);
 // PREFIX/DEVICE/status: retained, the device's state ("online" or "offline").
 std::string statusTopic(std::string_view prefix, std::string_view device);
+// PREFIX/DEVICE/latest/0x3C0013: retained, the last metric of a kind that the baseband reports
+// only once, such as the SIM files at power-on, for viewers that join later.
+std::string latestTopic(std::string_view prefix, std::string_view device, std::uint32_t metricId);
 
 }  // namespace tarn::mqtt

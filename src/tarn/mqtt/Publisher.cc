@@ -57,9 +57,9 @@ Publisher::~Publisher() {
   std::unique_lock lock(mutex_);
   if (connected_) {
     if (const auto goodbye = link_->publish(statusTopic_, statusMessage("offline"), 1, true)) {
-      statusIds_.push_back(*goodbye);
+      retainedIds_.push_back(*goodbye);
       statusSent_.wait_for(lock, kGoodbyeWait,
-                           [&] { return !std::ranges::count(statusIds_, *goodbye); });
+                           [&] { return !std::ranges::count(retainedIds_, *goodbye); });
     }
   }
   const std::size_t unsent = waiting_.size() + inflight_;
@@ -114,8 +114,9 @@ Publisher::Counts Publisher::counts() const {
 void Publisher::connected() {
   const std::lock_guard lock(mutex_);
   connected_ = true;
-  if (const auto online = link_->publish(statusTopic_, statusMessage("online"), 1, true))
-    statusIds_.push_back(*online);
+  sendRetained(statusTopic_, statusMessage("online"));
+  for (const auto& [topic, line] : retained_)
+    sendRetained(topic, line);
   if (droppedSinceLink_ > 0) {
     platform::log::plain(
         options_.name + ": the broker is back; " + std::to_string(droppedSinceLink_) +
@@ -132,7 +133,7 @@ void Publisher::disconnected() {
 
 void Publisher::published(int messageId) {
   const std::lock_guard lock(mutex_);
-  if (std::erase(statusIds_, messageId) > 0) {
+  if (std::erase(retainedIds_, messageId) > 0) {
     statusSent_.notify_all();
     return;
   }
@@ -144,6 +145,16 @@ void Publisher::published(int messageId) {
 void Publisher::sendWaiting() {
   while (!waiting_.empty() && inflight_ < kWindow && send(waiting_.front()))
     waiting_.pop_front();
+}
+
+void Publisher::retain(const std::string& topic, std::string line) {
+  const std::lock_guard lock(mutex_);
+  if (connected_) sendRetained(topic, line);
+  retained_.insert_or_assign(topic, std::move(line));
+}
+
+void Publisher::sendRetained(const std::string& topic, const std::string& message) {
+  if (const auto id = link_->publish(topic, message, 1, true)) retainedIds_.push_back(*id);
 }
 
 bool Publisher::send(const std::string& line) {

@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <deque>
+#include <map>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -58,6 +59,8 @@ class Publisher {
 
   // One metric log line. Any thread.
   void publish(std::string line);
+  // Keeps `line` retained on `topic`, now and on every connection, replacing what was there.
+  void retain(const std::string& topic, std::string line);
 
   Counts counts() const;
 
@@ -71,6 +74,7 @@ class Publisher {
   // Needs mutex_ held.
   void sendWaiting();
   bool send(const std::string& line);
+  void sendRetained(const std::string& topic, const std::string& message);
 
   const PublisherOptions options_;
   const std::string metricsTopic_;
@@ -81,8 +85,9 @@ class Publisher {
   std::deque<std::string> waiting_;
   std::size_t inflight_ = 0;
   bool connected_ = false;
-  // Status messages on their way, by message ID.
-  std::vector<int> statusIds_;
+  // Retained messages on their way, by message ID: they are no metrics.
+  std::vector<int> retainedIds_;
+  std::map<std::string, std::string> retained_;
   std::uint64_t droppedSinceLink_ = 0;
   Counts counts_;
 

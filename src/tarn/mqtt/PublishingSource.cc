@@ -4,14 +4,24 @@
 
 #include "tarn/Names.h"
 #include "tarn/log/MetricLog.h"
+#include "tarn/mqtt/BrokerAddress.h"
 
 namespace tarn::mqtt {
 
+namespace {
+
+// Metrics that a baseband reports once, when it powers on, and later only when asked: the SIM
+// files.
+constexpr std::uint32_t kReportedOnce[] = {0x3C0013};
+
+}  // namespace
+
 PublishingSource::PublishingSource(std::shared_ptr<service::MetricSource> source,
-                                   Publisher& publisher, std::string device,
+                                   Publisher& publisher, std::string prefix, std::string device,
                                    Clock::time_point began)
     : source_(std::move(source)),
       publisher_(publisher),
+      prefix_(std::move(prefix)),
       device_(std::move(device)),
       began_(began) {}
 
@@ -35,8 +45,11 @@ void PublishingSource::publish(const service::Metric& metric) {
       std::chrono::duration_cast<std::chrono::milliseconds>(Clock::now() - began_);
   const auto wallClock = std::chrono::duration_cast<std::chrono::milliseconds>(
       std::chrono::system_clock::now().time_since_epoch());
-  publisher_.publish(metricMessage(metric, std::max<std::int64_t>(sinceStart.count(), 0), device_,
-                                   wallClock.count()));
+  std::string message = metricMessage(metric, std::max<std::int64_t>(sinceStart.count(), 0),
+                                      device_, wallClock.count());
+  if (std::ranges::count(kReportedOnce, metric.metricId) > 0)
+    publisher_.retain(latestTopic(prefix_, device_, metric.metricId), message);
+  publisher_.publish(std::move(message));
 }
 
 std::string metricMessage(const service::Metric& metric, std::int64_t deliveryMs,

@@ -11,14 +11,16 @@ namespace tarn::mqtt {
 
 // Hands on what another metric source produces and publishes each metric as it passes: one
 // metric log line with "t_ms" counted from `began`, the device's name under "device" and the
-// wall-clock time under "unix_ms" (milliseconds since 1970). Query answers pass unpublished.
+// wall-clock time under "unix_ms" (milliseconds since 1970). Metrics that the baseband reports
+// only once (the SIM files) are also kept retained on PREFIX/DEVICE/latest/ID. Query answers
+// pass unpublished.
 class PublishingSource final : public service::MetricSource {
  public:
   using Clock = std::chrono::steady_clock;
 
   // `publisher` must outlive the source.
   PublishingSource(std::shared_ptr<service::MetricSource> source, Publisher& publisher,
-                   std::string device, Clock::time_point began = Clock::now());
+                   std::string prefix, std::string device, Clock::time_point began = Clock::now());
 
   void start(std::function<void(service::Metric)> deliver) override;
   void stop() override;
@@ -30,6 +32,7 @@ class PublishingSource final : public service::MetricSource {
 
   const std::shared_ptr<service::MetricSource> source_;
   Publisher& publisher_;
+  const std::string prefix_;
   const std::string device_;
   const Clock::time_point began_;
 };

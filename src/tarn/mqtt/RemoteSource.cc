@@ -59,7 +59,8 @@ std::optional<DeviceStatus> readStatusMessage(std::string_view message) {
 RemoteSource::RemoteSource(RemoteDevice device)
     : device_(std::move(device)),
       metricsTopic_(device_.broker.path + "/metrics"),
-      statusTopic_(device_.broker.path + "/status") {}
+      statusTopic_(device_.broker.path + "/status"),
+      latestTopics_(device_.broker.path + "/latest/") {}
 
 RemoteSource::~RemoteSource() {
   stop();
@@ -71,7 +72,7 @@ void RemoteSource::start(std::function<void(service::Metric)> deliver) {
   LinkOptions options;
   options.broker = device_.broker;
   options.caFile = device_.caFile;
-  options.subscriptions = {metricsTopic_, statusTopic_};
+  options.subscriptions = {metricsTopic_, statusTopic_, latestTopics_ + "+"};
   options.name = device_.name;
   link_ = std::make_unique<Link>(
       std::move(options),
@@ -123,13 +124,19 @@ void RemoteSource::receive(std::string_view topic, std::string_view payload) {
     status_ = *status;
     return;
   }
+  const bool retained = topic.starts_with(latestTopics_);
   ReadMetric read = readMetricMessage(payload);
   {
     const std::lock_guard lock(mutex_);
     if (!read.metric) {
       ++refused_;
-      platform::log::plain(device_.name + ": a message on " + metricsTopic_ + " refused: " +
+      platform::log::plain(device_.name + ": a message on " + std::string(topic) + " refused: " +
                            read.error + " (" + std::to_string(refused_) + " so far)");
+      return;
+    }
+    // A retained metric is older than any that came live, and is only there for queries.
+    if (retained) {
+      latest_.try_emplace(read.metric->metricId, *read.metric);
       return;
     }
     latest_.insert_or_assign(read.metric->metricId, *read.metric);

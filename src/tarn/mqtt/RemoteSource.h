@@ -45,7 +45,8 @@ struct RemoteDevice {
 };
 
 // The metrics of a device that publishes to a broker (tarnd --publish), as a metric source:
-// each metric as it arrives, and, for queries, the last metric of the kind asked for. Refused
+// each metric as it arrives, and, for queries, the last metric of the kind asked for, which may
+// be one the device keeps retained (PREFIX/DEVICE/latest/ID). Refused
 // messages are counted and logged, one line each; status changes are logged too. While the
 // broker or the device is away, nothing arrives and nothing else changes.
 class RemoteSource final : public service::MetricSource {
@@ -67,6 +68,7 @@ class RemoteSource final : public service::MetricSource {
   const RemoteDevice device_;
   const std::string metricsTopic_;
   const std::string statusTopic_;
+  const std::string latestTopics_;  // PREFIX/DEVICE/latest/
 
   std::function<void(service::Metric)> deliver_;
   mutable std::mutex mutex_;

@@ -109,6 +109,8 @@ std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& dev
     ::dup2(null, STDIN_FILENO);
     ::dup2(null, STDOUT_FILENO);
     ::dup2(null, STDERR_FILENO);
+    // Nothing of ours, such as the fleet's listening socket, stays open in the viewer.
+    ::close_range(STDERR_FILENO + 1, ~0U, 0);
     ::execv(argv[0], argv.data());
     ::_exit(127);
   }

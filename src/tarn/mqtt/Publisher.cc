@@ -37,7 +37,7 @@ Publisher::Publisher(PublisherOptions options)
       .broker = options_.broker,
       .caFile = options_.caFile,
       .clientId = options_.name + "-" + options_.device,
-      .will = std::pair(statusTopic_, statusMessage("offline")),
+      .will = std::pair(statusTopic_, statusMessage("offline", false)),
       .subscriptions = {},
       .maxInflight = kWindow,
       .name = options_.name,
@@ -70,7 +70,7 @@ Publisher::~Publisher() {
                          " metric(s) not yet taken by the broker were not sent");
 }
 
-std::string Publisher::statusMessage(std::string_view state) const {
+std::string Publisher::statusMessage(std::string_view state, bool withDrops) const {
   platform::Dictionary versions{
       {"norvo", std::string(NORVO_VERSION)},
       {"libmosquitto", libraryVersion()},
@@ -81,8 +81,8 @@ std::string Publisher::statusMessage(std::string_view state) const {
       {"device", options_.device},
       {"source", options_.source},
       {"versions", std::move(versions)},
-      {"dropped", static_cast<std::int64_t>(counts_.dropped)},
   };
+  if (withDrops) status.append("dropped", static_cast<std::int64_t>(counts_.dropped));
   return platform::toJson(status);
 }
 

@@ -64,8 +64,9 @@ class Publisher {
 
   Counts counts() const;
 
-  // The status message for `state` ("online", "offline"), as JSON.
-  std::string statusMessage(std::string_view state) const;
+  // The status message for `state` ("online", "offline"), as JSON; with the drops so far
+  // unless it is the last will, which is written before any.
+  std::string statusMessage(std::string_view state, bool withDrops = true) const;
 
  private:
   void connected();

@@ -5,6 +5,7 @@
 #include <csignal>
 #include <fstream>
 #include <iostream>
+#include <stdexcept>
 
 #include "app/RootNavigationController.h"
 #include "client/TarnWrapper.h"
@@ -26,7 +27,8 @@ constexpr std::string_view kUsage =
     "metric delivered to OUT.jsonl as a metric log, with \"t_ms\" counted from the start, until N\n"
     "seconds have passed or Ctrl-C. --seed chooses the drive (default 1, the viewer's), --speed\n"
     "runs it X times as fast as real time (default 1). norvo --replay OUT.jsonl plays it back.\n"
-    "--service dbus (or dbus:system, dbus:ADDRESS) records what tarnd delivers instead.\n"
+    "--service dbus (or dbus:system, dbus:ADDRESS) records what tarnd delivers instead, and\n"
+    "--service mqtt://HOST/PREFIX/DEVICE what a device publishes to a broker.\n"
     "--to pcapng|jsonl|csv writes the metrics as `norvo export` does instead, as they come; OUT\n"
     "may then be \"-\" for standard output: norvo record --to pcapng - | wireshark -k -i -\n";
 
@@ -82,10 +84,10 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);
-    if (!choice) return refuse("--service wants builtin, dbus, dbus:system or dbus:ADDRESS");
+    if (!choice) return refuse("--service wants " + std::string(kServiceChoices));
     options.run.service = *choice;
   }
-  if ((seed || speed) && options.run.service.bus)
+  if ((seed || speed) && !options.run.service.builtIn())
     return refuse("--seed and --speed tune the simulator inside Norvo; tarnd takes its own");
   return options;
 }
@@ -136,9 +138,9 @@ void MetricExporter::metricsDidUpdate(const platform::Dictionary& metric) {
 
 bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
                          std::shared_ptr<TarnWrapperDelegate> receiver) {
-  useService(run.service, run.service.bus
-                              ? nullptr
-                              : std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed));
+  useService(run.service, run.service.builtIn()
+                              ? std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed)
+                              : nullptr);
   bool subscribed = false;
   {
     TarnWrapper session;
@@ -191,8 +193,13 @@ int runRecordCommand(std::span<const std::string_view> arguments) {
     std::cerr << "norvo record: cannot write " << options->outPath << '\n';
     return 1;
   }
-  if (!runRecordingSession(options->run, *configuration, std::make_shared<MetricRecorder>(out))) {
-    std::cerr << "norvo record: the service refused the metric configuration\n";
+  try {
+    if (!runRecordingSession(options->run, *configuration, std::make_shared<MetricRecorder>(out))) {
+      std::cerr << "norvo record: the service refused the metric configuration\n";
+      return 1;
+    }
+  } catch (const std::runtime_error& error) {  // an MQTT broker's options that do not work
+    std::cerr << "norvo record: " << error.what() << '\n';
     return 1;
   }
   out.close();

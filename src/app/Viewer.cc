@@ -41,7 +41,10 @@ const std::string_view kViewerUsage =
     "                      network. Port 0 takes any free port.\n"
     "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
     "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
-    "                      or \"dbus:ADDRESS\" on another bus\n"
+    "                      or \"dbus:ADDRESS\" on another bus;\n"
+    "                      mqtt[s]://[USER[:PASS]@]HOST[:PORT]/PREFIX/DEVICE shows a device\n"
+    "                      that publishes to a broker (tarnd --publish)\n"
+    "  --mqtt-ca FILE      the certificate authority of an mqtts:// broker\n"
     "  --replay LOG.jsonl  replay a metric log (see norvo record) instead of simulating; lines\n"
     "                      that do not parse are reported and skipped\n"
     "  --speed X           replay X times as fast as recorded (default 1), or \"max\" for\n"
@@ -80,7 +83,7 @@ std::nullopt_t refuse(std::string_view why) {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> listen, service, replay, speed, source, refresh, log;
+  std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile;
   bool loop = false;
   const platform::CommandLineOption table[] = {
       {"--listen", &listen, "an address and a port"},
@@ -91,6 +94,7 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       {"--source", &source},
       {"--refresh", &refresh},
       {"--log", &log, "a file name, or - for standard output"},
+      {"--mqtt-ca", &caFile, "a certificate file"},
   };
   if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
     std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
@@ -105,8 +109,13 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);
-    if (!choice) return refuse("--service wants builtin, dbus, dbus:system or dbus:ADDRESS");
+    if (!choice) return refuse("--service wants " + std::string(kServiceChoices));
     options.service = *choice;
+  }
+  if (caFile) {
+    if (!options.service.broker || !options.service.broker->tls)
+      return refuse("--mqtt-ca goes with an mqtts:// service");
+    options.service.caFile = std::string(*caFile);
   }
   if (speed == "max") {
     options.replay.speed = std::nullopt;
@@ -115,9 +124,9 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
     if (!options.replay.speed) return refuse("--speed wants a number above 0 or \"max\"");
   }
   options.replay.loop = loop;
-  if (replay && options.service.bus) {
+  if (replay && !options.service.builtIn()) {
     return refuse(
-        "--replay goes with the built-in service; on D-Bus, run\n"
+        "--replay goes with the built-in service; elsewhere, run\n"
         "       tarnd --source replay:LOG.jsonl");
   }
   if ((speed || loop) && !replay) return refuse("--speed and --loop go with --replay");
@@ -176,16 +185,15 @@ int runViewer(std::span<const std::string_view> arguments) {
   std::optional<ViewerOptions> options = parseOptions(arguments);
   if (!options) return 2;
 
-  std::shared_ptr<tarn::service::MetricSource> source;
-  if (!options->service.bus) {  // on a bus, tarnd brings its own
-    try {
-      source = builtInSource(*options);
-    } catch (const std::runtime_error& error) {
-      std::cerr << "norvo: " << error.what() << '\n';
-      return 1;
-    }
+  try {
+    std::shared_ptr<tarn::service::MetricSource> source;
+    // Elsewhere, tarnd brings its own.
+    if (options->service.builtIn()) source = builtInSource(*options);
+    useService(options->service, std::move(source));
+  } catch (const std::runtime_error& error) {
+    std::cerr << "norvo: " << error.what() << '\n';
+    return 1;
   }
-  useService(options->service, std::move(source));
 
   const std::unique_ptr<ViewerOutput> output =
       ViewerOutput::open(options->log, sourceName(*options), viewerSeries());

@@ -1,9 +1,11 @@
+#include <algorithm>
 #include <iostream>
 #include <span>
 #include <string_view>
 #include <vector>
 
 #include "app/ExportCommand.h"
+#include "app/FleetCommand.h"
 #include "app/IntakeCommand.h"
 #include "app/RecordCommand.h"
 #include "app/Viewer.h"
@@ -42,9 +44,12 @@ int main(int argc, char** argv) {
   const std::vector<std::string_view> arguments(argv + 1, argv + argc);
   const std::string_view name = arguments.empty() ? "" : arguments.front();
   if (name == "--help" || name == "-h" || name == "help") {
-    std::cout << app::kViewerUsage << kCommandsUsage;
+    std::cout << app::kViewerUsage << '\n' << app::kFleetUsage << kCommandsUsage;
     return 0;
   }
+  // The fleet viewer watches a broker rather than one baseband service.
+  if (std::find(arguments.begin(), arguments.end(), "--fleet") != arguments.end())
+    return app::runFleet(arguments);
   // Without a command, Norvo is the viewer.
   if (arguments.empty() || name.starts_with("--")) return app::runViewer(arguments);
   for (const Command& command : kCommands) {

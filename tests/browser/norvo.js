@@ -14,13 +14,18 @@ const artifacts = process.env.ARTIFACTS ?? path.join(repository, 'test-artifacts
 
 // Resolves with Norvo's address once it has printed it.
 function startNorvo() {
-  const child = spawn(program, ['--listen', '127.0.0.1:0'], { stdio: ['ignore', 'pipe', 'inherit'] });
+  return startProgram(['--listen', '127.0.0.1:0'], /Open (http:\/\/127\.0\.0\.1:\d+)\/ in a browser/);
+}
+
+// Runs Norvo with `args`; `addressLine` finds the address it prints.
+function startProgram(args, addressLine) {
+  const child = spawn(program, args, { stdio: ['ignore', 'pipe', 'inherit'] });
   const exited = new Promise((resolve) => child.on('exit', (code, signal) => resolve({ code, signal })));
   const address = new Promise((resolve, reject) => {
     let output = '';
     child.stdout.on('data', (chunk) => {
       output += chunk;
-      const found = /Open (http:\/\/127\.0\.0\.1:\d+)\/ in a browser/.exec(output);
+      const found = addressLine.exec(output);
       if (found) resolve(found[1]);
       // Keep only the tail: the log goes on for as long as Norvo runs.
       if (output.length > 65536) output = output.slice(-1024);
@@ -69,4 +74,4 @@ async function screenshot(page, name) {
   await page.screenshot({ path: path.join(artifacts, `${name}.png`) });
 }
 
-module.exports = { startNorvo, startBrowser, screenshot };
+module.exports = { startNorvo, startProgram, startBrowser, screenshot, program };

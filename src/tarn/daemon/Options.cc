@@ -15,6 +15,11 @@ struct GivenOptions {
   std::optional<std::string_view> bus;
   std::optional<std::string_view> record;
   std::optional<std::string_view> refresh;
+  std::optional<std::string_view> publish;
+  std::optional<std::string_view> caFile;
+  std::optional<std::string_view> device;
+  std::optional<std::string_view> qos;
+  std::optional<std::string_view> queue;
   bool asFastAsPossible = false;
   bool loop = false;
 };
@@ -27,7 +32,54 @@ ParsedOptions refuse(std::string error) {
 
 // A D-Bus address names its transport before a colon, as in unix:path=/run/user/1000/bus.
 bool isBusChoice(std::string_view bus) {
-  return bus == "session" || bus == "system" || bus.find(':') != std::string_view::npos;
+  return bus == "session" || bus == "system" || bus == kNoBus ||
+         bus.find(':') != std::string_view::npos;
+}
+
+// The MQTT options, judged together; empty `error` when they make sense.
+std::optional<PublishChoice> readPublishChoice(const GivenOptions& given, std::string& error) {
+  if (!given.publish) {
+    if (given.caFile || given.device || given.qos || given.queue)
+      error = "--mqtt-ca, --device, --qos and --mqtt-queue go with --publish";
+    return std::nullopt;
+  }
+  mqtt::ParsedBrokerAddress parsed = mqtt::parseBrokerAddress(*given.publish);
+  if (!parsed.address) {
+    error = "--publish: " + parsed.error;
+    return std::nullopt;
+  }
+  PublishChoice publish;
+  publish.broker = std::move(*parsed.address);
+  if (given.caFile) {
+    if (!publish.broker.tls) {
+      error = "--mqtt-ca goes with an mqtts:// broker";
+      return std::nullopt;
+    }
+    publish.caFile = std::string(*given.caFile);
+  }
+  if (given.device) {
+    if (!mqtt::isTopicLevel(*given.device)) {
+      error = "--device wants a name without \"/\", \"+\" or \"#\"";
+      return std::nullopt;
+    }
+    publish.device = std::string(*given.device);
+  }
+  if (given.qos) {
+    if (*given.qos != "0" && *given.qos != "1") {
+      error = "--qos wants 0 or 1";
+      return std::nullopt;
+    }
+    publish.qos = *given.qos == "1" ? 1 : 0;
+  }
+  if (given.queue) {
+    const auto limit = platform::parseNumber<std::size_t>(*given.queue);
+    if (!limit) {
+      error = "--mqtt-queue wants a number of metrics";
+      return std::nullopt;
+    }
+    publish.queueLimit = *limit;
+  }
+  return publish;
 }
 
 }  // namespace
@@ -39,10 +91,19 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
 
   GivenOptions given;
   const platform::CommandLineOption table[] = {
-      {"--source", &given.source}, {"--seed", &given.seed},
-      {"--speed", &given.speed},   {"--bus", &given.bus},
-      {"--record", &given.record}, {"--as-fast-as-possible", &given.asFastAsPossible},
-      {"--loop", &given.loop},     {"--refresh", &given.refresh},
+      {"--source", &given.source},
+      {"--seed", &given.seed},
+      {"--speed", &given.speed},
+      {"--bus", &given.bus},
+      {"--record", &given.record},
+      {"--as-fast-as-possible", &given.asFastAsPossible},
+      {"--loop", &given.loop},
+      {"--refresh", &given.refresh},
+      {"--publish", &given.publish, "a broker address"},
+      {"--mqtt-ca", &given.caFile, "a certificate file"},
+      {"--device", &given.device, "a name"},
+      {"--qos", &given.qos},
+      {"--mqtt-queue", &given.queue, "a number of metrics"},
   };
   if (std::string error = platform::readCommandLine(arguments, table); !error.empty())
     return refuse(std::move(error));
@@ -97,10 +158,15 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
   if (given.bus) {
     if (!isBusChoice(*given.bus))
       return refuse(
-          "--bus wants session, system or a D-Bus address such as "
+          "--bus wants session, system, none or a D-Bus address such as "
           "unix:path=/run/user/1000/bus");
     options.bus = std::string(*given.bus);
   }
+  std::string publishError;
+  options.publish = readPublishChoice(given, publishError);
+  if (!publishError.empty()) return refuse(std::move(publishError));
+  if (options.bus == kNoBus && !options.publish)
+    return refuse("--bus none serves nobody: it goes with --publish");
   if (given.record) {
     if (given.record->empty()) return refuse("--record needs a file name");
     options.recordPath = std::string(*given.record);

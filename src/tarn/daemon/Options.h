@@ -1,6 +1,7 @@
 #pragma once
 
 #include <chrono>
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <span>
@@ -9,6 +10,7 @@
 #include <variant>
 
 #include "tarn/mm/SourceOption.h"
+#include "tarn/mqtt/BrokerAddress.h"
 #include "tarn/replay/ReplaySource.h"
 
 namespace tarn::daemon {
@@ -29,10 +31,26 @@ struct ModemManagerChoice {
   std::chrono::seconds refresh = mm::kDefaultRefresh;
 };
 
+// Where and how to publish the metrics over MQTT.
+struct PublishChoice {
+  // Its path is the topic prefix.
+  mqtt::BrokerAddress broker;
+  std::optional<std::string> caFile;
+  // Empty: the host name.
+  std::optional<std::string> device;
+  int qos = 1;
+  // Ten minutes of the simulated phone's metrics, which reports about 5.5 a second.
+  std::size_t queueLimit = 4000;
+};
+
+// The --bus value of a tarnd that only publishes.
+constexpr std::string_view kNoBus = "none";
+
 struct DaemonOptions {
   std::variant<SimulatorChoice, ReplayChoice, ModemManagerChoice> source;
-  // "session", "system" or a D-Bus address.
+  // "session", "system", a D-Bus address, or "none" to serve no bus and only publish.
   std::string bus = "session";
+  std::optional<PublishChoice> publish;
   std::optional<std::string> recordPath;
   bool help = false;
 };

@@ -75,6 +75,34 @@ TEST(DaemonOptions, ReadsAModemManagerSourceWithItsModemAndRefresh) {
   }
 }
 
+TEST(DaemonOptions, ReadsWhereAndHowToPublish) {
+  const ParsedOptions parsed =
+      parse({"--bus", "none", "--publish", "mqtts://car:s3:cr3t@[::1]:8884/drive/test/",
+             "--mqtt-ca", "ca.pem", "--device", "car-7", "--qos", "0", "--mqtt-queue", "12"});
+  ASSERT_TRUE(parsed.options) << parsed.error;
+  ASSERT_TRUE(parsed.options->publish);
+  const PublishChoice& publish = *parsed.options->publish;
+  EXPECT_EQ(publish.broker, (mqtt::BrokerAddress{.tls = true,
+                                                 .user = "car",
+                                                 .password = "s3:cr3t",
+                                                 .host = "::1",
+                                                 .port = 8884,
+                                                 .path = "drive/test"}));
+  EXPECT_EQ(publish.broker.shown(), "mqtts://[::1]:8884/drive/test");
+  EXPECT_EQ(publish.caFile, "ca.pem");
+  EXPECT_EQ(publish.device, "car-7");
+  EXPECT_EQ(publish.qos, 0);
+  EXPECT_EQ(publish.queueLimit, 12u);
+
+  const ParsedOptions defaults = parse({"--publish", "mqtt://broker.lan/fleet"});
+  ASSERT_TRUE(defaults.options && defaults.options->publish) << defaults.error;
+  EXPECT_EQ(defaults.options->publish->broker.shown(), "mqtt://broker.lan:1883/fleet");
+  EXPECT_FALSE(defaults.options->publish->broker.user);
+  EXPECT_FALSE(defaults.options->publish->device);
+  EXPECT_EQ(defaults.options->publish->qos, 1);
+  EXPECT_EQ(defaults.options->bus, "session");
+}
+
 TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp) {
   const struct {
     std::vector<std::string_view> arguments;
@@ -98,7 +126,25 @@ TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp)
       {{"--source", "replay:a.jsonl", "--speed", "2", "--as-fast-as-possible"},
        "--speed and --as-fast-as-possible exclude each other"},
       {{"--bus", "user"},
-       "--bus wants session, system or a D-Bus address such as unix:path=/run/user/1000/bus"},
+       "--bus wants session, system, none or a D-Bus address such as "
+       "unix:path=/run/user/1000/bus"},
+      {{"--bus", "none"}, "--bus none serves nobody: it goes with --publish"},
+      {{"--publish", "tcp://broker/fleet"},
+       "--publish: a broker address starts with mqtt:// or mqtts://"},
+      {{"--publish", "mqtt://broker"},
+       "--publish: the broker address needs a topic prefix after the host"},
+      {{"--publish", "mqtt://broker/fleet/#"},
+       "--publish: topic levels are not empty and hold no \"+\" or \"#\""},
+      {{"--publish", "mqtt://broker:0/fleet"},
+       "--publish: the broker's port is a number from 1 to 65535"},
+      {{"--publish", "mqtt://broker/fleet", "--mqtt-ca", "ca.pem"},
+       "--mqtt-ca goes with an mqtts:// broker"},
+      {{"--publish", "mqtt://broker/fleet", "--device", "car/1"},
+       "--device wants a name without \"/\", \"+\" or \"#\""},
+      {{"--publish", "mqtt://broker/fleet", "--qos", "2"}, "--qos wants 0 or 1"},
+      {{"--publish", "mqtt://broker/fleet", "--mqtt-queue", "-5"},
+       "--mqtt-queue wants a number of metrics"},
+      {{"--device", "car"}, "--mqtt-ca, --device, --qos and --mqtt-queue go with --publish"},
       {{"--record", ""}, "--record needs a file name"},
       {{"sim"}, "unexpected argument sim"},
   };

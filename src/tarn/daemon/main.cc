@@ -20,6 +20,8 @@
 #include "tarn/dbus/Service.h"
 #include "tarn/log/RecordingSource.h"
 #include "tarn/mm/ModemManagerSource.h"
+#include "tarn/mqtt/Publisher.h"
+#include "tarn/mqtt/PublishingSource.h"
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/service/Core.h"
 #include "tarn/sim/SimulatorSource.h"
@@ -35,10 +37,12 @@ constexpr std::string_view kUsage =
     "usage: tarnd [--source sim [--seed N] [--speed X]]\n"
     "       tarnd --source replay:LOG.jsonl [--speed X | --as-fast-as-possible] [--loop]\n"
     "       tarnd --source modemmanager[:MODEM] [--refresh SECONDS]\n"
-    "             [--bus session|system|ADDRESS] [--record OUT.jsonl]\n"
+    "             [--bus session|system|ADDRESS|none] [--record OUT.jsonl]\n"
+    "             [--publish mqtt[s]://[USER[:PASS]@]HOST[:PORT]/PREFIX [--mqtt-ca FILE]\n"
+    "              [--device ID] [--qos 0|1] [--mqtt-queue N]]\n"
     "\n"
     "Serves the baseband manager service on D-Bus under the name org.norvo.Tarn1 until SIGINT\n"
-    "or SIGTERM.\n"
+    "or SIGTERM, and publishes its metrics to an MQTT broker if asked to.\n"
     "\n"
     "options:\n"
     "  --source sim             the simulated phone (the default)\n"
@@ -56,9 +60,16 @@ constexpr std::string_view kUsage =
     "  --refresh SECONDS        how often to read the modem's signal and cells, 1 to 5\n"
     "                           (default 2)\n"
     "  --bus BUS                session (the default), system, or a D-Bus address such as\n"
-    "                           unix:path=/run/user/1000/bus\n"
+    "                           unix:path=/run/user/1000/bus; none only publishes\n"
     "  --record OUT.jsonl       write every metric the source produces to a metric log, with\n"
     "                           \"t_ms\" counted from the start, for --source replay:OUT.jsonl\n"
+    "  --publish URL            publish every metric to PREFIX/DEVICE/metrics on the broker,\n"
+    "                           and the device's state, retained, to PREFIX/DEVICE/status\n"
+    "  --mqtt-ca FILE           the certificate authority of an mqtts:// broker\n"
+    "  --device ID              the device's name under PREFIX (default: the host name)\n"
+    "  --qos 0|1                the MQTT quality of service of the metrics (default 1)\n"
+    "  --mqtt-queue N           metrics held while the broker is away (default 4000, ten\n"
+    "                           minutes of the simulated phone); past it the oldest go\n"
     "  --help                   show this text\n";
 
 constexpr int kExitFailure = 1;
@@ -106,6 +117,31 @@ std::shared_ptr<tarn::service::MetricSource> makeSource(const DaemonOptions& opt
   return std::make_shared<tarn::replay::ReplaySource>(replay.path, replay.options, std::cerr);
 }
 
+// The host name as one topic level, with what a topic level cannot hold made "_".
+std::string hostDevice() {
+  char name[256] = {};
+  if (gethostname(name, sizeof name - 1) != 0 || name[0] == '\0') return "tarnd";
+  std::string device(name);
+  for (char& c : device) {
+    if (c == '/' || c == '+' || c == '#') c = '_';
+  }
+  return device;
+}
+
+std::unique_ptr<tarn::mqtt::Publisher> startPublisher(const tarn::daemon::PublishChoice& choice,
+                                                      const std::string& device,
+                                                      const DaemonOptions& options) {
+  return std::make_unique<tarn::mqtt::Publisher>(tarn::mqtt::PublisherOptions{
+      .broker = choice.broker,
+      .caFile = choice.caFile,
+      .device = device,
+      .qos = choice.qos,
+      .queueLimit = choice.queueLimit,
+      .source = describeSource(options),
+      .name = "tarnd",
+  });
+}
+
 std::string explainServiceError(const sdbus::Error& error) {
   if (error.getName() == kNameTaken) return "the name is taken (is another tarnd running?)";
   return error.getName() + ": " + error.getMessage();
@@ -142,13 +178,32 @@ void blockShutdownSignals(sigset_t& signals) {
 
 int serve(const DaemonOptions& options, const sigset_t& shutdownSignals) {
   std::shared_ptr<tarn::service::MetricSource> source = makeSource(options);
+  const bool onBus = options.bus != tarn::daemon::kNoBus;
   const std::string bus = describeBus(options.bus);
   std::unique_ptr<sdbus::IConnection> connection;
-  try {
-    connection = tarn::dbus::connectToBus(options.bus);
-  } catch (const sdbus::Error& error) {
-    std::cerr << "tarnd: cannot connect to " << bus << ": " << error.getMessage() << '\n';
-    return kExitFailure;
+  if (onBus) {
+    try {
+      connection = tarn::dbus::connectToBus(options.bus);
+    } catch (const sdbus::Error& error) {
+      std::cerr << "tarnd: cannot connect to " << bus << ": " << error.getMessage() << '\n';
+      return kExitFailure;
+    }
+  }
+  // Before the service, so that it outlives the source that feeds it.
+  std::unique_ptr<tarn::mqtt::Publisher> publisher;
+  if (options.publish) {
+    const std::string device = options.publish->device.value_or(hostDevice());
+    std::cout << "tarnd: publishing to " << options.publish->broker.shown() << " as " << device
+              << std::endl;
+    try {
+      publisher = startPublisher(*options.publish, device, options);
+    } catch (const std::runtime_error& error) {
+      std::cerr << "tarnd: cannot publish to " << options.publish->broker.shown() << ": "
+                << error.what() << '\n';
+      return kExitFailure;
+    }
+    source = std::make_shared<tarn::mqtt::PublishingSource>(std::move(source), *publisher,
+                                                            options.publish->broker.path, device);
   }
   // Opened once the bus is reached, so that a daemon that cannot start leaves an earlier recording
   // alone; two daemons recording to one file are kept apart by its lock.
@@ -160,7 +215,7 @@ int serve(const DaemonOptions& options, const sigset_t& shutdownSignals) {
 
   BusLoss busLoss;
   std::optional<std::string> lostBecause;
-  {
+  if (onBus) {
     auto core = std::make_shared<tarn::service::Core>(std::move(source));
     std::optional<tarn::dbus::Service> service;
     try {
@@ -177,6 +232,13 @@ int serve(const DaemonOptions& options, const sigset_t& shutdownSignals) {
     int signal = 0;
     sigwait(&shutdownSignals, &signal);
     lostBecause = busLoss.reason();
+  } else {
+    // Nobody listens here, so a replay starts at once.
+    source->start([](const tarn::service::Metric&) {});
+    std::cout << "tarnd: serving no bus (source: " << describeSource(options) << ")" << std::endl;
+    int signal = 0;
+    sigwait(&shutdownSignals, &signal);
+    source->stop();
   }
   // The service and its source have stopped: the log is complete.
   if (record && !record->close()) {

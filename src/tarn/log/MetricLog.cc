@@ -93,6 +93,12 @@ ParsedLine parseMetricLogLine(std::string_view line) {
 
 std::optional<std::string> formatMetricLogLine(const platform::Dictionary& record,
                                                std::optional<std::int64_t> deliveryMs) {
+  return formatMetricLogLine(record, deliveryMs, {});
+}
+
+std::optional<std::string> formatMetricLogLine(const platform::Dictionary& record,
+                                               std::optional<std::int64_t> deliveryMs,
+                                               const platform::Dictionary& tail) {
   const auto integer = [&record](std::string_view key) -> std::optional<std::int64_t> {
     const platform::Value* value = record.find(key);
     return value != nullptr ? value->asInteger() : std::nullopt;
@@ -108,6 +114,8 @@ std::optional<std::string> formatMetricLogLine(const platform::Dictionary& recor
     if (const auto value = integer(key)) line.append(std::string(key), *value);
   }
   if (deliveryMs) line.append(std::string(kDeliveryKey), *deliveryMs);
+  for (const auto& [key, value] : tail)
+    line.set(key, value);
   return platform::toJson(line);
 }
 

@@ -39,6 +39,11 @@ ParsedLine parseMetricLogLine(std::string_view line);
 // other keys are not.
 std::optional<std::string> formatMetricLogLine(const platform::Dictionary& record,
                                                std::optional<std::int64_t> deliveryMs = {});
+// The same line with the entries of `tail` after its own keys, such as the device that published
+// the record and when. A reader takes them into the record as other keys.
+std::optional<std::string> formatMetricLogLine(const platform::Dictionary& record,
+                                               std::optional<std::int64_t> deliveryMs,
+                                               const platform::Dictionary& tail);
 
 // Reads a log line by line. Blank lines are passed over; a line may end in CR LF.
 class MetricLogReader {

@@ -1,5 +1,7 @@
 #include "ui/web/ListenAddress.h"
 
+#include <boost/asio/ip/address.hpp>
+#include <boost/beast/core/string.hpp>
 #include <charconv>
 #include <cstdint>
 
@@ -38,6 +40,20 @@ std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint) {
   else
     host = address.to_string();
   return "http://" + host + ":" + std::to_string(endpoint.port()) + "/";
+}
+
+bool isLoopbackHost(std::string_view host) {
+  if (host.starts_with('[')) {
+    const std::size_t close = host.find(']');
+    if (close == std::string_view::npos) return false;
+    host = host.substr(1, close - 1);
+  } else if (const std::size_t colon = host.rfind(':'); colon != std::string_view::npos) {
+    host = host.substr(0, colon);
+  }
+  if (boost::beast::iequals(host, "localhost")) return true;
+  boost::system::error_code invalid;
+  const auto address = boost::asio::ip::make_address(std::string(host), invalid);
+  return !invalid && address.is_loopback();
 }
 
 }  // namespace ui::web

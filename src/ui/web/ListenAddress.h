@@ -14,4 +14,8 @@ std::optional<boost::asio::ip::tcp::endpoint> parseListenAddress(std::string_vie
 // The address a browser opens to reach `endpoint`, e.g. "http://127.0.0.1:8080/".
 std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint);
 
+// Whether a request's Host names this machine by loopback: "localhost", "127.0.0.1:8080",
+// "[::1]:8080" and the like.
+bool isLoopbackHost(std::string_view host);
+
 }  // namespace ui::web

@@ -8,6 +8,7 @@
 #include "platform/Json.h"
 #include "platform/Log.h"
 #include "ui/web/Assets.h"
+#include "ui/web/ListenAddress.h"
 #include "ui/web/PageHtml.h"
 #include "ui/web/PageJson.h"
 #include "ui/web/PageView.h"
@@ -28,21 +29,6 @@ ErrorFormat formatFor(std::string_view path) {
 
 Response error(const Request& request, http::status status, ErrorFormat format) {
   return errorResponse(status, format, request.version(), request.keep_alive());
-}
-
-// "localhost", "127.0.0.1:8080", "[::1]:8080" and the like.
-bool isLoopbackHost(std::string_view host) {
-  if (host.starts_with('[')) {
-    const std::size_t close = host.find(']');
-    if (close == std::string_view::npos) return false;
-    host = host.substr(1, close - 1);
-  } else if (const std::size_t colon = host.rfind(':'); colon != std::string_view::npos) {
-    host = host.substr(0, colon);
-  }
-  if (boost::beast::iequals(host, "localhost")) return true;
-  boost::system::error_code invalid;
-  const auto address = boost::asio::ip::make_address(std::string(host), invalid);
-  return !invalid && address.is_loopback();
 }
 
 }  // namespace

@@ -1,0 +1,142 @@
+#include "app/FleetCommand.h"
+
+#include <boost/asio/io_context.hpp>
+#include <boost/asio/signal_set.hpp>
+#include <chrono>
+#include <csignal>
+#include <iostream>
+#include <optional>
+#include <stdexcept>
+#include <string>
+
+#include "app/DeviceViewers.h"
+#include "fleet/Fleet.h"
+#include "fleet/FleetSite.h"
+#include "platform/CommandLine.h"
+#include "tarn/mqtt/Link.h"
+#include "ui/web/ListenAddress.h"
+#include "ui/web/Server.h"
+
+namespace app {
+
+const std::string_view kFleetUsage =
+    "usage: norvo --fleet mqtt[s]://[USER[:PASS]@]HOST[:PORT]/PREFIX [--listen ADDR:PORT]\n"
+    "             [--mqtt-ca FILE]\n"
+    "\n"
+    "Serves /fleet: every device that publishes under PREFIX (tarnd --publish), with its\n"
+    "status, technology, network, serving cell, band, levels and the age of its last metric,\n"
+    "live. Each device's name opens its screens, shown by a viewer of their own.\n"
+    "\n"
+    "options:\n"
+    "  --listen ADDR:PORT  where to serve the page (default 127.0.0.1:8080)\n"
+    "  --mqtt-ca FILE      the certificate authority of an mqtts:// broker\n"
+    "  --help              show this text\n";
+
+namespace {
+
+std::int64_t steadyMs() {
+  return std::chrono::duration_cast<std::chrono::milliseconds>(
+             std::chrono::steady_clock::now().time_since_epoch())
+      .count();
+}
+
+struct FleetOptions {
+  tarn::mqtt::BrokerAddress broker;
+  std::optional<std::string> caFile;
+  boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
+};
+
+std::optional<FleetOptions> parseFleetOptions(std::span<const std::string_view> arguments) {
+  std::optional<std::string_view> broker, listen, caFile;
+  const platform::CommandLineOption table[] = {
+      {"--fleet", &broker, "a broker address"},
+      {"--listen", &listen, "an address and a port"},
+      {"--mqtt-ca", &caFile, "a certificate file"},
+  };
+  const auto refuse = [](std::string_view why) -> std::optional<FleetOptions> {
+    std::cerr << "norvo: " << why << "\n\n" << kFleetUsage;
+    return std::nullopt;
+  };
+  if (const std::string error = platform::readCommandLine(arguments, table); !error.empty())
+    return refuse(error);
+  FleetOptions options;
+  const auto parsed = tarn::mqtt::parseBrokerAddress(broker.value_or(""));
+  if (!parsed.address) return refuse("--fleet: " + parsed.error);
+  options.broker = *parsed.address;
+  if (caFile) {
+    if (!options.broker.tls) return refuse("--mqtt-ca goes with an mqtts:// broker");
+    options.caFile = std::string(*caFile);
+  }
+  if (listen) {
+    const auto endpoint = ui::web::parseListenAddress(*listen);
+    if (!endpoint) return refuse("--listen wants an address and a port, such as 127.0.0.1:8080");
+    options.listen = *endpoint;
+  }
+  return options;
+}
+
+}  // namespace
+
+int runFleet(std::span<const std::string_view> arguments) {
+  if (platform::asksForHelp(arguments)) {
+    std::cout << kFleetUsage;
+    return 0;
+  }
+  const std::optional<FleetOptions> options = parseFleetOptions(arguments);
+  if (!options) return 2;
+  const std::string& prefix = options->broker.path;
+
+  fleet::Fleet fleet(prefix);
+  DeviceViewers viewers(options->broker, options->caFile, options->listen.address());
+  fleet::FleetSite site(fleet, &steadyMs, !options->listen.address().is_loopback(),
+                        [&viewers](const std::string& device, std::string_view host,
+                                   std::string& why) { return viewers.open(device, host, why); });
+
+  boost::asio::io_context context(1);
+  ui::web::Server server(
+      context, [&site](const ui::web::Request& request) { return site.handle(request); }, {});
+  if (const auto error = server.listen(options->listen)) {
+    std::cerr << "norvo: cannot listen on " << ui::web::browserAddress(options->listen) << ": "
+              << error.message() << '\n';
+    return 1;
+  }
+
+  tarn::mqtt::LinkOptions linkOptions;
+  linkOptions.broker = options->broker;
+  linkOptions.caFile = options->caFile;
+  linkOptions.subscriptions = {prefix + "/+/metrics", prefix + "/+/status"};
+  linkOptions.name = "norvo";
+  std::optional<tarn::mqtt::Link> link;
+  try {
+    link.emplace(std::move(linkOptions),
+                 tarn::mqtt::Link::Handlers{
+                     .connected = {},
+                     .disconnected = {},
+                     .published = {},
+                     .message =
+                         [&fleet](std::string_view topic, std::string_view payload) {
+                           fleet.receive(topic, payload, steadyMs());
+                         },
+                     .subscribed = {},
+                 });
+    link->start();
+  } catch (const std::runtime_error& error) {
+    std::cerr << "norvo: " << error.what() << '\n';
+    return 1;
+  }
+
+  // Flushed, as scripts wait for it on a pipe.
+  std::cout << "Open " << ui::web::browserAddress(server.localEndpoint())
+            << "fleet in a browser; Ctrl-C stops." << std::endl;
+  boost::asio::signal_set signals(context, SIGINT, SIGTERM);
+  signals.async_wait([&](const boost::system::error_code& error, int) {
+    if (error) return;
+    server.stop();
+    context.stop();
+  });
+  context.run();
+  link.reset();
+  return 0;
+}
+
+}  // namespace app

@@ -9,6 +9,7 @@ packages=(
   libboost1.81-dev libboost-json1.81-dev
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev
   libgtest-dev libgmock-dev libbenchmark-dev
+  libtomlplusplus-dev
   chromium nodejs
 )
 

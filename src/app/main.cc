@@ -3,6 +3,7 @@
 #include <string_view>
 #include <vector>
 
+#include "app/EventsCommand.h"
 #include "app/IntakeCommand.h"
 #include "app/RecordCommand.h"
 #include "app/Viewer.h"
@@ -15,6 +16,7 @@ struct Command {
 };
 
 constexpr Command kCommands[] = {
+    {"events", &app::runEventsCommand},
     {"intake", &app::runIntakeCommand},
     {"record", &app::runRecordCommand},
 };
@@ -24,6 +26,8 @@ constexpr std::string_view kCommandsUsage =
     "usage: norvo <command> [arguments]\n"
     "\n"
     "commands:\n"
+    "  events LOG.jsonl [--json]\n"
+    "      Find the events of a metric log: RRC changes, handovers, failures, registrations...\n"
     "  intake LOG.jsonl [--dump-store OUT.json]\n"
     "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
     "  record OUT.jsonl [--seconds N] [--seed S] [--speed X]\n"

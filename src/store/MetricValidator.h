@@ -1,10 +1,12 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "client/TarnWrapperDelegate.h"
 #include "platform/Value.h"
@@ -102,6 +104,13 @@ class MetricValidator : public TarnWrapperDelegate {
     return store_[which];
   }
 
+  // Back to the store of a new intake: no metric ID, no display dictionaries, placeholder rows.
+  // Observers stay.
+  void clearStore() {
+    metricID_.reset();
+    store_ = DisplayStore();
+  }
+
   // LTE downlink bandwidth index to MHz.
   const std::map<std::int32_t, float>& dlbwlookup() const;
 
@@ -116,6 +125,16 @@ class MetricValidator : public TarnWrapperDelegate {
   // decode; the store then keeps what it had.
   virtual bool isMetricIDValidWithMetricdict(const platform::Dictionary& metric);
 
+  // Sees each metric the intake accepts, on the main queue, once its payload has decoded and
+  // before the conversions rewrite its display dictionary: the metric ID, the payload (none
+  // when the record has none) and the dictionary as decoded. Observers must not keep the
+  // references, nor hand the intake another metric meanwhile.
+  using AcceptedMetricObserver = std::function<void(
+      std::int64_t metricID, const platform::Bytes* payload, const platform::Dictionary& decoded)>;
+  void addAcceptedMetricObserver(AcceptedMetricObserver observer) {
+    acceptedMetricObservers_.push_back(std::move(observer));
+  }
+
   // "yyyy-MM-dd HH:mm:ss zzz" in the current time zone and locale; fractions of a second are
   // dropped. Empty when the time cannot be shown as a date.
   virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
@@ -124,6 +143,7 @@ class MetricValidator : public TarnWrapperDelegate {
   TarnWrapper* const mySharedTarnInstance_;
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
+  std::vector<AcceptedMetricObserver> acceptedMetricObservers_;
 };
 
 }  // namespace store

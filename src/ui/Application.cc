@@ -17,7 +17,8 @@ namespace {
 struct Running {
   Running(const Storyboard& mainInterface, DisplayOptions& display)
       : pages(mainInterface, {}),
-        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings)}),
+        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings),
+                     std::move(display.routes)}),
         server(platform::mainQueue(),
                [this](const web::Request& request) { return site.handle(request); }, {}),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}

@@ -31,6 +31,8 @@ struct DisplayOptions {
   boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
   // Extra JSON readings under /api/<name>.
   std::map<std::string, web::Site::Reading, std::less<>> readings;
+  // Pages and APIs the app answers itself, by path (see web/Site.h).
+  std::map<std::string, web::Site::Route, std::less<>> routes;
 };
 
 // Runs the application on the main queue until it is asked to stop: makes the window and its

@@ -12,9 +12,11 @@ const program = process.env.NORVO ?? path.join(repository, 'build', 'src', 'app'
 const browserPath = process.env.CHROMIUM ?? '/usr/bin/chromium';
 const artifacts = process.env.ARTIFACTS ?? path.join(repository, 'test-artifacts');
 
-// Resolves with Norvo's address once it has printed it.
-function startNorvo() {
-  const child = spawn(program, ['--listen', '127.0.0.1:0'], { stdio: ['ignore', 'pipe', 'inherit'] });
+// Resolves with Norvo's address once it has printed it. `args` go after the address.
+function startNorvo(args = []) {
+  const child = spawn(program, ['--listen', '127.0.0.1:0', ...args], {
+    stdio: ['ignore', 'pipe', 'inherit'],
+  });
   const exited = new Promise((resolve) => child.on('exit', (code, signal) => resolve({ code, signal })));
   const address = new Promise((resolve, reject) => {
     let output = '';
@@ -69,4 +71,4 @@ async function screenshot(page, name) {
   await page.screenshot({ path: path.join(artifacts, `${name}.png`) });
 }
 
-module.exports = { startNorvo, startBrowser, screenshot };
+module.exports = { program, startNorvo, startBrowser, screenshot };

@@ -10,18 +10,22 @@
 
 namespace ui::web {
 
-// What the browser and scripts can ask for. Every answer is a pure reading: no request changes
-// what the screens show.
+// What the browser and scripts can ask for. Every answer but the app's own routes is a pure
+// reading: no request changes what the screens show.
 //
 //   GET /                     the root screen, as a page
 //   GET /LTE/CA%20Status      the screen reached by tapping those rows, as a page
 //   GET /api/screens/<path>   the same screen's table as JSON
 //   GET /api/<name>           one of the data readings the app adds, as JSON
 //   GET /assets/<name>        the style sheet, script and icon of the pages
+//   any /<route>              a page or an API the app answers itself
 class Site {
  public:
   // Produces the JSON text of one data reading.
   using Reading = std::function<std::string()>;
+  // Answers every request for its path, whatever the method; it refuses the methods it does not
+  // take itself. Runs on the main queue.
+  using Route = std::function<Response(const Request& request)>;
 
   struct Options {
     // Answers requests for any host name; otherwise only for loopback names and addresses, so
@@ -29,6 +33,8 @@ class Site {
     bool anyHost = false;
     // By name: "store" answers GET /api/store.
     std::map<std::string, Reading, std::less<>> readings;
+    // By path: "/timeline" answers GET /timeline. Routes come before readings and screens.
+    std::map<std::string, Route, std::less<>> routes;
   };
 
   Site(OpenPages& pages, Options options);

@@ -15,6 +15,7 @@ all: build
 deps:
 	@tools/install-deps.sh
 	@test -d tests/browser/node_modules || (cd tests/browser && npm ci --no-audit --no-fund)
+	@test -d src/ui/web/vendor/node_modules || (cd src/ui/web/vendor && npm ci --no-audit --no-fund)
 
 build: deps
 	@$(call configure,$(BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo)

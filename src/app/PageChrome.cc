@@ -1,18 +1,16 @@
 #include "app/PageChrome.h"
 
-#include "app/ApiResponses.h"
+#include "platform/Json.h"
 
 namespace app {
 
-void PageChrome::addRoute(ui::DisplayOptions& display) const {
-  display.routes.emplace("/api/chrome", [chrome = *this](const ui::web::Request& request) {
-    if (!isRead(request)) return methodNotAllowed(request, "GET, HEAD");
+void PageChrome::addReading(ui::DisplayOptions& display) const {
+  display.readings.emplace("chrome", [chrome = *this] {
     std::optional<platform::Dictionary> replay;
     if (chrome.replayState) replay = chrome.replayState();
-    return jsonResponse(
-        request, platform::Dictionary{
-                     {"alerts", chrome.activeAlerts ? chrome.activeAlerts() : platform::List()},
-                     {"replay", replay ? platform::Value(std::move(*replay)) : platform::Value()}});
+    return platform::toJson(platform::Dictionary{
+        {"alerts", chrome.activeAlerts ? chrome.activeAlerts() : platform::List()},
+        {"replay", replay ? platform::Value(std::move(*replay)) : platform::Value()}});
   });
 }
 

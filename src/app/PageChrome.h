@@ -17,7 +17,7 @@ struct PageChrome {
   // Empty, or answering nothing, when no replay runs.
   std::function<std::optional<platform::Dictionary>()> replayState;
 
-  void addRoute(ui::DisplayOptions& display) const;
+  void addReading(ui::DisplayOptions& display) const;
 };
 
 }  // namespace app

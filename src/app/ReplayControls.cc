@@ -5,10 +5,11 @@
 #include <boost/json/value.hpp>
 #include <string>
 
-#include "app/ApiResponses.h"
 #include "events/EventDetector.h"
+#include "platform/Json.h"
 #include "platform/Log.h"
 #include "platform/MainQueue.h"
+#include "ui/web/Responses.h"
 
 namespace app {
 
@@ -23,6 +24,19 @@ constexpr std::size_t kBatch = 2000;
 // A speed beyond this is no replay any more; "max" says it better.
 constexpr double kMaxSpeed = 10000.0;
 constexpr std::size_t kMaxBody = 4096;
+
+Response jsonResponse(const Request& request, const platform::Dictionary& body) {
+  return ui::web::makeResponse(http::status::ok, "application/json", platform::toJson(body),
+                               request.version(), request.keep_alive());
+}
+
+// As the site's other refusals: {"error": the status's reason, "detail": why}.
+Response jsonError(const Request& request, http::status status, std::string_view detail) {
+  const platform::Dictionary body{{"error", std::string(http::obsolete_reason(status))},
+                                  {"detail", detail}};
+  return ui::web::makeResponse(status, "application/json", platform::toJson(body),
+                               request.version(), request.keep_alive());
+}
 
 platform::Value speedValue(const std::optional<double>& speed) {
   return speed ? platform::Value(*speed) : platform::Value("max");
@@ -62,11 +76,10 @@ ReplayControls::ReplayControls(player::Drive drive, std::optional<double> speed,
       markers_(driveMarkers(player_.drive())),
       timer_(platform::mainQueue()) {}
 
-void ReplayControls::addRoutes(ui::DisplayOptions& display) {
+void ReplayControls::addPages(ui::DisplayOptions& display) {
   display.routes.emplace("/api/replay", [this](const Request& request) { return api(request); });
-  display.routes.emplace("/api/replay/markers", [this](const Request& request) {
-    if (!isRead(request)) return methodNotAllowed(request, "GET, HEAD");
-    return jsonResponse(request, platform::Dictionary{{"markers", markers_}});
+  display.readings.emplace("replay/markers", [this] {
+    return platform::toJson(platform::Dictionary{{"markers", markers_}});
   });
 }
 
@@ -97,8 +110,14 @@ platform::Dictionary ReplayControls::stateDictionary() const {
 }
 
 Response ReplayControls::api(const Request& request) {
-  if (isRead(request)) return jsonResponse(request, stateDictionary());
-  if (request.method() != http::verb::post) return methodNotAllowed(request, "GET, HEAD, POST");
+  if (request.method() == http::verb::get || request.method() == http::verb::head)
+    return jsonResponse(request, stateDictionary());
+  if (request.method() != http::verb::post) {
+    Response refused = jsonError(request, http::status::method_not_allowed,
+                                 "this address takes GET, HEAD and POST");
+    refused.set(http::field::allow, "GET, HEAD, POST");
+    return refused;
+  }
   // A page elsewhere cannot send JSON here without asking first, and it is never told yes.
   if (!request[http::field::content_type].starts_with("application/json"))
     return jsonError(request, http::status::unsupported_media_type, "send a JSON object");

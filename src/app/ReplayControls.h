@@ -31,7 +31,7 @@ class ReplayControls {
   ReplayControls(const ReplayControls&) = delete;
   ReplayControls& operator=(const ReplayControls&) = delete;
 
-  void addRoutes(ui::DisplayOptions& display);
+  void addPages(ui::DisplayOptions& display);
   // Starts playing once the main queue runs.
   void start();
 

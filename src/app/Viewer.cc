@@ -9,6 +9,7 @@
 #include "app/AppDelegate.h"
 #include "app/MainInterface.h"
 #include "app/PageChrome.h"
+#include "app/RecordClock.h"
 #include "app/ReplayControls.h"
 #include "app/ServiceOption.h"
 #include "app/ViewerAlerts.h"
@@ -17,6 +18,7 @@
 #include "platform/Json.h"
 #include "platform/ParseNumber.h"
 #include "player/Drive.h"
+#include "series/SeriesStore.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
 #include "tarn/sim/SimulatorSource.h"
@@ -156,23 +158,37 @@ int runViewer(std::span<const std::string_view> arguments) {
   display.readings.emplace("store",
                            [&intake] { return platform::toJson(store::dumpStore(intake)); });
   ViewerEvents events(intake);
-  events.addRoutes(display);
-  ViewerAlerts alerts(viewerAlertRules(options->alertsPath), {}, intake, events.ring(),
-                      !drive.has_value());
+  events.addPages(display);
+  RecordClock recordTime(intake);
+  series::SeriesStore levels([&recordTime] { return recordTime.nowMs(); });
+  intake.addStoreObserver(
+      [&levels](store::DisplayDictionary replaced, const store::MetricValidator& converted) {
+        levels.storeDidUpdate(replaced, converted);
+      });
+  ViewerAlerts alerts(
+      viewerAlertRules(options->alertsPath),
+      [&levels](std::string_view name) -> std::optional<alerts::Reading> {
+        const auto latest = levels.latest(name);
+        if (!latest) return std::nullopt;
+        return alerts::Reading{latest->timeMs, latest->value};
+      },
+      intake, recordTime, events.ring(), !drive.has_value());
   std::optional<ReplayControls> replay;
   if (drive) {
     replay.emplace(std::move(*drive), options->replaySpeed, options->loop, intake, [&] {
       intake.clearStore();
       events.reset();
+      recordTime.reset();
+      levels.clear();
       alerts.reset();
     });
-    replay->addRoutes(display);
+    replay->addPages(display);
     replay->start();
   }
   PageChrome chrome;
   chrome.activeAlerts = [&alerts] { return alerts.active(); };
   if (replay) chrome.replayState = [&replay] { return replay->stateDictionary(); };
-  chrome.addRoute(display);
+  chrome.addReading(display);
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

@@ -4,6 +4,7 @@
 #include <string>
 
 #include "alerts/AlertMonitor.h"
+#include "app/RecordClock.h"
 #include "store/MetricValidator.h"
 #include "ui/Timer.h"
 
@@ -14,14 +15,16 @@ namespace app {
 // built-in rules.
 std::vector<alerts::AlertRule> viewerAlertRules(const std::optional<std::string>& file);
 
-// The alerts of the running viewer: watched after each metric the intake accepts, at the
-// record's time, and once a second by the clock for silence in a live session. Their events go
-// to the viewer's ring; those active show as the banner of every page.
+// The alerts of the running viewer: watched after each metric that changed the store, at the
+// record's time, and once a second by the wall clock for silence in a live session. Their events
+// go to the viewer's ring; those active show as the banner of every page.
 class ViewerAlerts {
  public:
-  // Observes `intake` from now on; add it after whatever fills the series it reads.
+  // Observes `intake` from now on; make it after whatever fills the series it reads, so that it
+  // sees each metric's samples.
   ViewerAlerts(std::vector<alerts::AlertRule> rules, alerts::SeriesReader read,
-               store::MetricValidator& intake, events::EventRing& ring, bool live);
+               store::MetricValidator& intake, const RecordClock& recordTime,
+               events::EventRing& ring, bool live);
   ViewerAlerts(const ViewerAlerts&) = delete;
   ViewerAlerts& operator=(const ViewerAlerts&) = delete;
 
@@ -30,7 +33,6 @@ class ViewerAlerts {
 
  private:
   alerts::AlertMonitor monitor_;
-  std::int64_t lastTimeMs_ = 0;
   ui::Timer clock_;
 };
 

@@ -2,25 +2,29 @@
 
 #include <string>
 
-#include "app/ApiResponses.h"
 #include "events/EventJson.h"
 #include "platform/Format.h"
+#include "platform/Json.h"
 #include "platform/ParseNumber.h"
 #include "store/Dispatch.h"
-#include "ui/web/Assets.h"
-#include "ui/web/Query.h"
-#include "ui/web/Responses.h"
 
 namespace app {
 
 namespace {
 
 namespace http = ui::web::http;
-using ui::web::Request;
-using ui::web::Response;
+using Answer = ui::web::Site::QueryAnswer;
 
 constexpr std::size_t kDefaultLimit = 500;
 constexpr std::size_t kMaxLimit = 5000;
+
+Answer refuse(http::status status, std::string detail) {
+  return {status, {}, std::move(detail)};
+}
+
+Answer answer(const platform::Dictionary& body) {
+  return {http::status::ok, platform::toJson(body), {}};
+}
 
 // Calls `take` with each item of a comma-separated list; stops at the first it refuses.
 template <class Take>
@@ -91,17 +95,14 @@ ViewerEvents::ViewerEvents(store::MetricValidator& intake) {
   });
 }
 
-void ViewerEvents::addRoutes(ui::DisplayOptions& display) {
-  display.routes.emplace("/api/events",
-                         [this](const Request& request) { return eventsApi(request); });
-  display.routes.emplace("/api/events/metric",
-                         [this](const Request& request) { return metricApi(request); });
-  display.routes.emplace("/timeline", [](const Request& request) {
-    if (!isRead(request)) return methodNotAllowed(request, "GET, HEAD");
-    const ui::web::Asset* page = ui::web::findAsset("timeline.html");
-    return ui::web::makeResponse(http::status::ok, page->contentType, std::string(page->content),
-                                 request.version(), request.keep_alive());
+void ViewerEvents::addPages(ui::DisplayOptions& display) {
+  display.queries.emplace("events", [this](const ui::web::QueryParameters& parameters) {
+    return eventsApi(parameters);
   });
+  display.queries.emplace("events/metric", [this](const ui::web::QueryParameters& parameters) {
+    return metricApi(parameters);
+  });
+  display.documents.push_back({"/timeline", "timeline.html", "Timeline"});
 }
 
 void ViewerEvents::reset() {
@@ -109,13 +110,9 @@ void ViewerEvents::reset() {
   detector_.reset();
 }
 
-Response ViewerEvents::eventsApi(const Request& request) const {
-  if (!isRead(request)) return methodNotAllowed(request, "GET, HEAD");
-  const auto parameters = ui::web::parseQuery(request.target());
-  if (!parameters) return jsonError(request, http::status::bad_request, "malformed query");
-  const EventQuery query = readEventQuery(*parameters);
-  if (!query.error.empty()) return jsonError(request, http::status::bad_request, query.error);
-
+Answer ViewerEvents::eventsApi(const ui::web::QueryParameters& parameters) const {
+  const EventQuery query = readEventQuery(parameters);
+  if (!query.error.empty()) return refuse(http::status::bad_request, query.error);
   platform::List found;
   for (const events::Event* event : ring_.newestFirst(query.filter, query.limit))
     found.emplace_back(events::eventDictionary(*event));
@@ -123,34 +120,29 @@ Response ViewerEvents::eventsApi(const Request& request) const {
   body.append("epoch", ring_.epoch());
   body.append("next_id", ring_.nextId());
   body.append("events", std::move(found));
-  return jsonResponse(request, body);
+  return answer(body);
 }
 
-Response ViewerEvents::metricApi(const Request& request) const {
-  if (!isRead(request)) return methodNotAllowed(request, "GET, HEAD");
-  const auto parameters = ui::web::parseQuery(request.target());
-  const auto idText = parameters ? ui::web::queryValue(*parameters, "id") : std::nullopt;
-  const auto id = idText ? platform::parseNumber<std::uint64_t>(*idText) : std::nullopt;
-  if (!id) return jsonError(request, http::status::bad_request, "id wants an event id");
+Answer ViewerEvents::metricApi(const ui::web::QueryParameters& parameters) const {
+  const auto idText = parameters.find("id");
+  const auto id = idText != parameters.end() ? platform::parseNumber<std::uint64_t>(idText->second)
+                                             : std::nullopt;
+  if (!id) return refuse(http::status::bad_request, "id wants an event id");
 
   const events::Event* event = ring_.find(*id);
-  if (event == nullptr) return jsonError(request, http::status::not_found, "no such event");
-  if (!event->metric) {
-    return jsonError(request, http::status::not_found, "no metric is behind this event");
-  }
+  if (event == nullptr) return refuse(http::status::not_found, "no such event");
+  if (!event->metric) return refuse(http::status::not_found, "no metric is behind this event");
   const events::SourceMetric& metric = *event->metric;
   const store::Handler* handler = store::handlerFor(metric.metricID);
   std::optional<platform::Dictionary> decoded;
   if (metric.kept && handler != nullptr) decoded = handler->decode(&metric.payload);
-  if (!decoded) {
-    return jsonError(request, http::status::not_found, "the metric was too large to keep");
-  }
+  if (!decoded) return refuse(http::status::not_found, "the metric was too large to keep");
   platform::Dictionary body;
   body.append("id", event->id);
   body.append("metric_id", metric.metricID);
   body.append("metric_id_hex", platform::format("%X", metric.metricID));
   body.append("decoded", std::move(*decoded));
-  return jsonResponse(request, body);
+  return answer(body);
 }
 
 }  // namespace app

@@ -15,7 +15,7 @@ namespace app {
 //   GET /api/events/metric?id=ID
 //       the metric behind one event, decoded: {"id", "metric_id", "metric_id_hex", "decoded"}
 //   GET /timeline
-//       the timeline page
+//       the timeline page, linked from the launch screen
 class ViewerEvents {
  public:
   // Observes `intake` from now on; both live on the main queue.
@@ -23,7 +23,7 @@ class ViewerEvents {
   ViewerEvents(const ViewerEvents&) = delete;
   ViewerEvents& operator=(const ViewerEvents&) = delete;
 
-  void addRoutes(ui::DisplayOptions& display);
+  void addPages(ui::DisplayOptions& display);
 
   // Forgets every event and what the detectors remember, as before the first metric.
   void reset();
@@ -31,8 +31,8 @@ class ViewerEvents {
   events::EventRing& ring() { return ring_; }
 
  private:
-  ui::web::Response eventsApi(const ui::web::Request& request) const;
-  ui::web::Response metricApi(const ui::web::Request& request) const;
+  ui::web::Site::QueryAnswer eventsApi(const ui::web::QueryParameters& parameters) const;
+  ui::web::Site::QueryAnswer metricApi(const ui::web::QueryParameters& parameters) const;
 
   events::EventRing ring_;
   events::EventDetector detector_{ring_};

@@ -4,11 +4,14 @@
 #include <boost/json/parse.hpp>
 #include <string>
 
+#include "app/MainInterface.h"
 #include "app/ReplayControls.h"
 #include "app/ViewerEvents.h"
 #include "messages/Records.h"
 #include "platform/Log.h"
 #include "store/MetricValidator.h"
+#include "ui/web/OpenPages.h"
+#include "ui/web/Site.h"
 
 namespace app {
 namespace {
@@ -27,18 +30,24 @@ platform::Dictionary rrcRecord(KCellularLteRrcState::State state,
   return {{"kKeyMetricID", MetricValidator::K_LTE_RRC_STATE}, {"kKeyPayload", record.data()}};
 }
 
+// The viewer's events and replay, asked through the site as a browser asks.
 class ViewerRoutes : public ::testing::Test {
  protected:
-  ViewerRoutes() { events.addRoutes(display); }
+  ViewerRoutes() { events.addPages(display); }
 
   ui::web::Response call(const std::string& target, http::verb method = http::verb::get,
                          std::string body = {}, std::string type = "application/json") {
-    const std::string path = target.substr(0, target.find('?'));
+    if (!site) {
+      site = std::make_unique<ui::web::Site>(
+          pages, ui::web::Site::Options{false, display.readings, display.queries, display.documents,
+                                        display.routes});
+    }
     ui::web::Request request(method, target, 11);
+    request.set(http::field::host, "127.0.0.1:8080");
     request.set(http::field::content_type, type);
     request.body() = std::move(body);
     request.prepare_payload();
-    return display.routes.at(path)(request);
+    return site->handle(request);
   }
 
   json::value answer(const std::string& target, http::verb method = http::verb::get,
@@ -52,6 +61,9 @@ class ViewerRoutes : public ::testing::Test {
   MetricValidator intake{nullptr};
   ViewerEvents events{intake};
   ui::DisplayOptions display;
+  ui::Storyboard board = mainInterface(&intake);
+  ui::web::OpenPages pages{board, {}};
+  std::unique_ptr<ui::web::Site> site;
 };
 
 TEST_F(ViewerRoutes, AnswersTheEventsAsAskedAndTheMetricBehindOne) {
@@ -70,7 +82,7 @@ TEST_F(ViewerRoutes, AnswersTheEventsAsAskedAndTheMetricBehindOne) {
     std::size_t count;
   } filters[] = {{"/api/events?severity=failure", 1}, {"/api/events?kind=rrc,sim", 1},
                  {"/api/events?after=1", 1},          {"/api/events?since=1718100000001", 0},
-                 {"/api/events?limit=1", 1},          {"/api/events?kind=rrc&kind=radio-link", 2}};
+                 {"/api/events?limit=1", 1},          {"/api/events?kind=rrc,radio-link", 2}};
   for (const auto& filter : filters)
     EXPECT_EQ(answer(filter.target).at("events").as_array().size(), filter.count) << filter.target;
   for (const char* malformed :
@@ -91,6 +103,7 @@ TEST_F(ViewerRoutes, AnswersTheEventsAsAskedAndTheMetricBehindOne) {
   const ui::web::Response page = call("/timeline");
   EXPECT_EQ(page.result(), http::status::ok);
   EXPECT_NE(page.body().find("<h1>Timeline</h1>"), std::string::npos);
+  EXPECT_NE(call("/").body().find(R"(<a href="/timeline">Timeline</a>)"), std::string::npos);
 }
 
 TEST_F(ViewerRoutes, ControlsTheReplayAndSeeksByRebuilding) {
@@ -107,7 +120,7 @@ TEST_F(ViewerRoutes, ControlsTheReplayAndSeeksByRebuilding) {
     intake.clearStore();
     events.reset();
   });
-  controls.addRoutes(display);
+  controls.addPages(display);
 
   const json::value start = answer("/api/replay");
   EXPECT_EQ(start, json::parse(R"({"playing":false,"speed":1.0,"position_ms":0,

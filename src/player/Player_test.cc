@@ -7,8 +7,10 @@
 #include <vector>
 
 #include "events/EventDetector.h"
+#include "platform/Format.h"
 #include "platform/Json.h"
 #include "platform/Log.h"
+#include "series/SeriesStore.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
 #include "tarn/sim/Simulator.h"
@@ -150,20 +152,39 @@ TEST(PlayerSeek, RebuildsWhatAnIntakeOfTheLogUpToThatTimeBuilds) {
   }
   const Drive copy = drive;
 
+  // The store, the events and the series, as the viewer keeps them.
   struct Viewer {
     Viewer() {
-      intake.addAcceptedMetricObserver(
-          [this](std::int64_t id, const platform::Bytes* payload,
-                 const platform::Dictionary& decoded) { detector.observe(id, payload, decoded); });
+      intake.addAcceptedMetricObserver([this](std::int64_t id, const platform::Bytes* payload,
+                                              const platform::Dictionary& decoded) {
+        detector.observe(id, payload, decoded);
+        const platform::Value* time = decoded.find("timestamp");
+        if (time != nullptr && time->asInteger()) recordTimeMs = *time->asInteger();
+      });
+      intake.addStoreObserver(
+          [this](store::DisplayDictionary replaced, const store::MetricValidator& converted) {
+            levels.storeDidUpdate(replaced, converted);
+          });
     }
     std::string events() const {
       std::string texts;
       ring.forEach([&texts](const events::Event& event) { texts += event.text + '\n'; });
       return texts;
     }
+    std::string samples() const {
+      std::string texts;
+      for (const auto& series : levels.definitions()) {
+        const std::optional<series::SampleRange> held = levels.since(series.name, 0);
+        for (const series::Sample sample : *held)
+          texts += platform::format("%s %d %g\n", series.name, sample.timeMs, sample.value);
+      }
+      return texts;
+    }
     store::MetricValidator intake{nullptr};
     events::EventRing ring;
     events::EventDetector detector{ring};
+    std::int64_t recordTimeMs = 0;
+    series::SeriesStore levels{[this] { return recordTimeMs; }};
   };
   Viewer seeking;
   Player player(
@@ -172,6 +193,7 @@ TEST(PlayerSeek, RebuildsWhatAnIntakeOfTheLogUpToThatTimeBuilds) {
          seeking.intake.clearStore();
          seeking.ring.clear();
          seeking.detector.reset();
+         seeking.levels.clear();
        },
        [&seeking](const platform::Dictionary& record) { seeking.intake.metricsDidUpdate(record); }},
       1.0, false, [] { return Clock::now(); });
@@ -187,6 +209,7 @@ TEST(PlayerSeek, RebuildsWhatAnIntakeOfTheLogUpToThatTimeBuilds) {
               platform::toJson(store::dumpStore(fresh.intake)))
         << seekTo;
     EXPECT_EQ(seeking.events(), fresh.events()) << seekTo;
+    EXPECT_EQ(seeking.samples(), fresh.samples()) << seekTo;
     if (seekTo > 0) {
       EXPECT_FALSE(fresh.events().empty()) << seekTo;
     }

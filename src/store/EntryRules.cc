@@ -44,9 +44,10 @@ std::optional<Value> floatResult(const Value& entry, Formula formula) {
   return Value(static_cast<float>(formula(static_cast<double>(static_cast<float>(*number)))));
 }
 
-// The result of a rule: a new value, Null to remove the entry, or nothing to leave it.
-std::optional<Value> apply(EntryRule rule, const Value& entry,
-                           const TimestampFormatter& formatTimestamp) {
+}  // namespace
+
+std::optional<Value> convertValue(EntryRule rule, const Value& entry,
+                                  const TimestampFormatter& formatTimestamp) {
   switch (rule) {
     case EntryRule::CentiDbInteger:
       if (const auto level = entry.asInteger()) return Value(*level / 100);
@@ -88,13 +89,11 @@ std::optional<Value> apply(EntryRule rule, const Value& entry,
   return std::nullopt;
 }
 
-}  // namespace
-
 void convertEntry(platform::Dictionary& dictionary, EntryConversion conversion,
                   const TimestampFormatter& formatTimestamp) {
   Value* entry = dictionary.find(conversion.key);
   if (entry == nullptr) return;
-  std::optional<Value> result = apply(conversion.rule, *entry, formatTimestamp);
+  std::optional<Value> result = convertValue(conversion.rule, *entry, formatTimestamp);
   if (!result) return;
   if (result->isNull()) {
     dictionary.erase(conversion.key);

@@ -39,6 +39,11 @@ struct EntryConversion {
 void convertEntry(platform::Dictionary& dictionary, EntryConversion conversion,
                   const TimestampFormatter& formatTimestamp);
 
+// The result of the rule on one value: the new value, Null when the rule drops the entry, or
+// nothing when the value is not of the type the rule reads.
+std::optional<platform::Value> convertValue(EntryRule rule, const platform::Value& value,
+                                            const TimestampFormatter& formatTimestamp);
+
 enum class ValueShape {
   IntegerList,     // a list whose elements are all integers
   Dictionary,      // a dictionary

@@ -68,9 +68,14 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
         observe(*metricID_, payload, decoded);
     };
   }
-  return runHandler(
-      *handler, payload, store_,
-      [this](double milliseconds) { return formatTimestamp(milliseconds); }, observeDecoded);
+  if (!runHandler(
+          *handler, payload, store_,
+          [this](double milliseconds) { return formatTimestamp(milliseconds); }, observeDecoded)) {
+    return false;
+  }
+  for (const StoreObserver& observer : storeObservers_)
+    observer(handler->display, *this);
+  return true;
 }
 
 std::optional<std::string> MetricValidator::formatTimestamp(double milliseconds) const {

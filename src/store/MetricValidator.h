@@ -135,6 +135,15 @@ class MetricValidator : public TarnWrapperDelegate {
     acceptedMetricObservers_.push_back(std::move(observer));
   }
 
+  // Told after each metric that changed the store, in the order added, which display dictionary
+  // the metric replaced; the store is converted by then. What keeps data derived from the store
+  // (the graphs' series) is added by the app, so the store knows nothing of it.
+  using StoreObserver =
+      std::function<void(DisplayDictionary replaced, const MetricValidator& store)>;
+  void addStoreObserver(StoreObserver observer) {
+    storeObservers_.push_back(std::move(observer));
+  }
+
   // "yyyy-MM-dd HH:mm:ss zzz" in the current time zone and locale; fractions of a second are
   // dropped. Empty when the time cannot be shown as a date.
   virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
@@ -144,6 +153,7 @@ class MetricValidator : public TarnWrapperDelegate {
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
   std::vector<AcceptedMetricObserver> acceptedMetricObservers_;
+  std::vector<StoreObserver> storeObservers_;
 };
 
 }  // namespace store

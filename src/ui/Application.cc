@@ -17,8 +17,9 @@ namespace {
 struct Running {
   Running(const Storyboard& mainInterface, DisplayOptions& display)
       : pages(mainInterface, {}),
-        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings),
-                     std::move(display.routes)}),
+        site(pages,
+             {!display.listen.address().is_loopback(), std::move(display.readings),
+              std::move(display.queries), std::move(display.documents), std::move(display.routes)}),
         server(platform::mainQueue(),
                [this](const web::Request& request) { return site.handle(request); }, {}),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}
@@ -51,8 +52,9 @@ int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterfa
       platform::stopMainQueue();
       return;
     }
-    platform::log::plainf("Open %s in a browser; Ctrl-C stops.",
-                          web::browserAddress(running->server.localEndpoint()));
+    const std::string address = web::browserAddress(running->server.localEndpoint());
+    platform::log::plainf("Open %s in a browser; Ctrl-C stops.", address);
+    if (display.didStartServing) display.didStartServing(address);
     running->signals.async_wait([&](const boost::system::error_code& error, int) {
       if (error) return;
       delegate.applicationWillTerminate();

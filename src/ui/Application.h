@@ -1,8 +1,11 @@
 #pragma once
 
 #include <boost/asio/ip/tcp.hpp>
+#include <functional>
 #include <memory>
 #include <optional>
+#include <string>
+#include <vector>
 
 #include "platform/Value.h"
 #include "ui/Storyboard.h"
@@ -29,8 +32,13 @@ class ApplicationDelegate {
 
 struct DisplayOptions {
   boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
-  // Extra JSON readings under /api/<name>.
+  // Extra JSON readings under /api/<name>, with and without parameters.
   std::map<std::string, web::Site::Reading, std::less<>> readings;
+  std::map<std::string, web::Site::Query, std::less<>> queries;
+  // Pages beside the screens, linked from the root screen.
+  std::vector<web::Site::Document> documents;
+  // Told, on the main queue, the address to open once the pages are served.
+  std::function<void(const std::string& address)> didStartServing;
   // Pages and APIs the app answers itself, by path (see web/Site.h).
   std::map<std::string, web::Site::Route, std::less<>> routes;
 };

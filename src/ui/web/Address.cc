@@ -13,23 +13,28 @@ std::optional<int> hexDigit(char c) {
   return std::nullopt;
 }
 
-std::optional<std::string> decodeSegment(std::string_view segment) {
-  if (segment.empty()) return std::nullopt;
+// Percent escapes decoded; in a query, '+' also stands for a space.
+std::optional<std::string> decodeComponent(std::string_view component, bool plusIsSpace) {
   std::string text;
-  text.reserve(segment.size());
-  for (std::size_t i = 0; i < segment.size(); ++i) {
-    if (segment[i] != '%') {
-      text += segment[i];
+  text.reserve(component.size());
+  for (std::size_t i = 0; i < component.size(); ++i) {
+    if (component[i] != '%') {
+      text += plusIsSpace && component[i] == '+' ? ' ' : component[i];
       continue;
     }
-    if (i + 2 >= segment.size()) return std::nullopt;
-    const auto high = hexDigit(segment[i + 1]);
-    const auto low = hexDigit(segment[i + 2]);
+    if (i + 2 >= component.size()) return std::nullopt;
+    const auto high = hexDigit(component[i + 1]);
+    const auto low = hexDigit(component[i + 2]);
     if (!high || !low) return std::nullopt;
     text += static_cast<char>(*high * 16 + *low);
     i += 2;
   }
   return text;
+}
+
+std::optional<std::string> decodeSegment(std::string_view segment) {
+  if (segment.empty()) return std::nullopt;
+  return decodeComponent(segment, false);
 }
 
 bool isUnreserved(unsigned char c) {
@@ -67,6 +72,23 @@ std::optional<Path> decodePath(std::string_view path) {
     if (end == std::string_view::npos) return segments;
     start = end + 1;
   }
+}
+
+std::optional<QueryParameters> decodeQuery(std::string_view query) {
+  QueryParameters parameters;
+  while (!query.empty()) {
+    const std::size_t end = query.find('&');
+    const std::string_view pair = query.substr(0, end);
+    query = end == std::string_view::npos ? std::string_view() : query.substr(end + 1);
+    if (pair.empty()) continue;
+    const std::size_t equals = pair.find('=');
+    auto name = decodeComponent(pair.substr(0, equals), true);
+    auto value = decodeComponent(
+        equals == std::string_view::npos ? std::string_view() : pair.substr(equals + 1), true);
+    if (!name || !value) return std::nullopt;
+    parameters.insert_or_assign(std::move(*name), std::move(*value));
+  }
+  return parameters;
 }
 
 std::string encodePath(const Path& path) {

@@ -28,5 +28,18 @@ TEST(AnAddress, EscapesEverythingButUnreservedCharactersAndRoundTrips) {
   EXPECT_EQ(appendToAddress("/LTE", "CA Status"), "/LTE/CA%20Status");
 }
 
+TEST(AQuery, GivesItsDecodedParametersOrNothingWhenAnEscapeIsBroken) {
+  const std::pair<const char*, std::optional<QueryParameters>> cases[] = {
+      {"", QueryParameters{}},
+      {"name=lte.rsrp&since=0", QueryParameters{{"name", "lte.rsrp"}, {"since", "0"}}},
+      {"name=a+b%2Bc&&flag", QueryParameters{{"name", "a b+c"}, {"flag", ""}}},
+      {"since=1&since=2&=x", QueryParameters{{"since", "2"}, {"", "x"}}},
+      {"name=%zz", std::nullopt},
+      {"na%2=1", std::nullopt},
+  };
+  for (const auto& [query, parameters] : cases)
+    EXPECT_EQ(decodeQuery(query), parameters) << query;
+}
+
 }  // namespace
 }  // namespace ui::web

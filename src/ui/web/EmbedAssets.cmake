@@ -4,7 +4,7 @@
 set(entries "")
 foreach(asset ${ASSETS})
   get_filename_component(name ${asset} NAME)
-  get_filename_component(extension ${asset} EXT)
+  get_filename_component(extension ${asset} LAST_EXT)
   if(extension STREQUAL ".css")
     set(type "text/css; charset=utf-8")
   elseif(extension STREQUAL ".js")

@@ -92,7 +92,19 @@ std::string renderHtml(const PageView& page) {
   }
   out += "<h1>";
   appendEscaped(out, page.title);
-  out += "</h1></header>\n<main id=\"table\" data-source=\"/api/screens";
+  out += "</h1>";
+  if (!page.barLinks.empty()) {
+    out += "<nav class=\"links\">";
+    for (const BarLink& link : page.barLinks) {
+      out += "<a href=\"";
+      appendEscaped(out, link.href);
+      out += "\">";
+      appendEscaped(out, link.title);
+      out += "</a>";
+    }
+    out += "</nav>";
+  }
+  out += "</header>\n<main id=\"table\" data-source=\"/api/screens";
   if (page.address != "/") appendEscaped(out, page.address);
   out += "\">\n";
   for (const SectionView& section : page.sections) {

@@ -23,7 +23,7 @@ PageView describe(const Page& page) {
   const std::vector<ViewController*> stack = page.navigation().viewControllers();
   const ViewController& top = *stack.back();
 
-  PageView view{top.title().value_or(""), page.address(), std::nullopt, {}};
+  PageView view{top.title().value_or(""), page.address(), std::nullopt, {}, {}};
   if (stack.size() > 1) {
     Path parent = page.path();
     parent.pop_back();

@@ -27,11 +27,18 @@ struct BackLink {
   std::string href;
 };
 
+// A link of the top bar to a page beside the screens, such as the dashboard.
+struct BarLink {
+  std::string title;
+  std::string href;
+};
+
 struct PageView {
   std::string title;
   std::string address;
   std::optional<BackLink> back;  // absent on the root screen
   std::vector<SectionView> sections;
+  std::vector<BarLink> barLinks;
 };
 
 PageView describe(const Page& page);

@@ -5,6 +5,7 @@
 #include <boost/beast/http/field.hpp>
 #include <exception>
 
+#include "platform/Json.h"
 #include "platform/Log.h"
 #include "ui/web/Assets.h"
 #include "ui/web/PageHtml.h"
@@ -81,6 +82,12 @@ Response Site::route(const Request& request, std::string_view path) {
   if (path.starts_with(kScreensApi) && path[kScreensApi.size()] == '/')
     return screenPage(request, path.substr(kScreensApi.size()), true);
   if (path.starts_with(kApi)) return reading(request, path.substr(kApi.size()));
+  if (const Document* found = document(path)) {
+    Response response = asset(request, found->asset);
+    // The document's own address is what the browser keeps.
+    response.set(http::field::cache_control, "no-store");
+    return response;
+  }
   return screenPage(request, path, false);
 }
 
@@ -91,7 +98,11 @@ Response Site::screenPage(const Request& request, std::string_view path, bool js
   Page* page = pages_.open(*rows, OpenPages::Clock::now());
   if (page == nullptr) return error(request, http::status::not_found, format);
 
-  const PageView view = describe(*page);
+  PageView view = describe(*page);
+  if (!view.back) {
+    for (const Document& linked : options_.documents)
+      view.barLinks.push_back({linked.title, linked.path});
+  }
   if (json)
     return makeResponse(http::status::ok, "application/json", renderJson(view), request.version(),
                         request.keep_alive());
@@ -113,11 +124,37 @@ Response Site::asset(const Request& request, std::string_view name) {
 }
 
 Response Site::reading(const Request& request, std::string_view name) {
+  if (const auto withQuery = options_.queries.find(name); withQuery != options_.queries.end())
+    return query(request, withQuery->second);
   const auto found = options_.readings.find(name);
   if (found == options_.readings.end())
     return error(request, http::status::not_found, ErrorFormat::Json);
   return makeResponse(http::status::ok, "application/json", found->second(), request.version(),
                       request.keep_alive());
+}
+
+Response Site::query(const Request& request, const Query& answer) {
+  const std::string_view target = request.target();
+  const std::size_t mark = target.find('?');
+  const std::optional<QueryParameters> parameters =
+      decodeQuery(mark == std::string_view::npos ? std::string_view() : target.substr(mark + 1));
+  QueryAnswer answered =
+      parameters ? answer(*parameters)
+                 : QueryAnswer{http::status::bad_request, {}, "the query has a broken % escape"};
+  if (answered.status == http::status::ok) {
+    return makeResponse(http::status::ok, "application/json", std::move(answered.json),
+                        request.version(), request.keep_alive());
+  }
+  const std::string_view reason = http::obsolete_reason(answered.status);
+  const platform::Dictionary error{{"error", reason}, {"detail", std::move(answered.detail)}};
+  return makeResponse(answered.status, "application/json", platform::toJson(error),
+                      request.version(), request.keep_alive());
+}
+
+const Site::Document* Site::document(std::string_view path) const {
+  for (const Document& candidate : options_.documents)
+    if (candidate.path == path) return &candidate;
+  return nullptr;
 }
 
 bool Site::hostAllowed(const Request& request) const {

@@ -6,6 +6,7 @@
 
 #include "platform/Log.h"
 #include "ui/testing/TestScreens.h"
+#include "ui/web/Assets.h"
 #include "ui/web/OpenPages.h"
 #include "ui/web/Responses.h"
 
@@ -41,6 +42,8 @@ class ASite : public ::testing::Test {
   Site site{pages,
             {false,
              {{"store", [] { return std::string(R"({"a":1})"); }}},
+             {},
+             {},
              {{"/mine", [](const Request& request) {
                  return makeResponse(http::status::accepted, "text/plain",
                                      std::string(request.method_string()), request.version(),
@@ -138,7 +141,7 @@ TEST_F(ASite, AnswersOnlyForLoopbackHostNamesUnlessToldOtherwise) {
        {"evil.example", "evil.example:8080", "10.0.0.1:8080", "[::1", "localhost.evil"})
     EXPECT_EQ(get("/", host).result(), http::status::misdirected_request) << host;
 
-  Site open(pages, {true, {}, {}});
+  Site open(pages, {true, {}, {}, {}, {}});
   Request request(http::verb::get, "/", 11);
   request.set(http::field::host, "viewer.example:8080");
   EXPECT_EQ(open.handle(request).result(), http::status::ok);
@@ -207,6 +210,64 @@ TEST_F(ASite, KeepsAPageOpenWhileItIsAskedForAndClosesItWhenIdle) {
   EXPECT_EQ(pages.size(), 1u);
   pages.closeIdle(start + 26s);
   EXPECT_EQ(pages.size(), 0u);
+}
+
+class ASiteWithPagesOfItsOwn : public ASite {
+ protected:
+  static Site::QueryAnswer echo(const QueryParameters& parameters) {
+    const auto name = parameters.find("name");
+    if (name == parameters.end()) return {http::status::bad_request, {}, "which name?"};
+    return {http::status::ok, "{\"name\":\"" + name->second + "\"}", {}};
+  }
+
+  Site withPages{
+      pages, {false, {}, {{"echo", &echo}}, {{"/dashboard", "dashboard.html", "Dashboard"}}, {}}};
+
+  Response getFrom(Site& answering, std::string target) {
+    Request request(http::verb::get, target, 11);
+    request.set(http::field::host, "localhost");
+    return answering.handle(request);
+  }
+};
+
+TEST_F(ASiteWithPagesOfItsOwn, ServesTheDocumentAndLinksToItFromTheRootScreenOnly) {
+  const Response dashboard = getFrom(withPages, "/dashboard");
+  ASSERT_EQ(dashboard.result(), http::status::ok);
+  EXPECT_EQ(dashboard[http::field::content_type], "text/html; charset=utf-8");
+  EXPECT_EQ(dashboard.body(), findAsset("dashboard.html")->content);
+  EXPECT_EQ(dashboard[http::field::cache_control], "no-store");
+
+  const std::string link = R"(<nav class="links"><a href="/dashboard">Dashboard</a></nav>)";
+  EXPECT_NE(getFrom(withPages, "/").body().find(link), std::string::npos);
+  EXPECT_EQ(getFrom(withPages, "/Beta").body().find(link), std::string::npos);
+  EXPECT_EQ(get("/").body().find("links"), std::string::npos);
+  EXPECT_EQ(get("/dashboard").result(), http::status::not_found);
+}
+
+TEST_F(ASiteWithPagesOfItsOwn, HandsAQueryItsParametersAndSendsItsRefusalsAsJson) {
+  struct Case {
+    const char* target;
+    http::status status;
+    json::value body;
+  };
+  const Case cases[] = {
+      {"/api/echo?name=lte%2Ersrp&x=1", http::status::ok, {{"name", "lte.rsrp"}}},
+      {"/api/echo?x=1",
+       http::status::bad_request,
+       {{"error", "Bad Request"}, {"detail", "which name?"}}},
+      {"/api/echo",
+       http::status::bad_request,
+       {{"error", "Bad Request"}, {"detail", "which name?"}}},
+      {"/api/echo?name=%z",
+       http::status::bad_request,
+       {{"error", "Bad Request"}, {"detail", "the query has a broken % escape"}}},
+  };
+  for (const Case& c : cases) {
+    const Response response = getFrom(withPages, c.target);
+    EXPECT_EQ(response.result(), c.status) << c.target;
+    EXPECT_EQ(response[http::field::content_type], "application/json") << c.target;
+    EXPECT_EQ(json::parse(response.body()), c.body) << c.target;
+  }
 }
 
 TEST(OpenPages, CloseTheLeastRecentlyAskedForPageWhenFull) {

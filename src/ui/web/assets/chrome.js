@@ -1,19 +1,18 @@
-// Page chrome beside the tables, on every page: links to the other views from the launch
-// screen, a banner of the alerts that are active, and, when Norvo replays a recorded drive, a
-// player bar to play, pause, change speed and seek, with the drive's events marked along it.
+// Page chrome beside the tables, on every page: a banner of the alerts that are active and,
+// when Norvo replays a recorded drive, a player bar to play, pause, change speed and seek, with
+// the drive's events marked along it.
 'use strict';
 
 (() => {
   const bar = document.querySelector('.bar');
 
-  // --- Links to the other views ---
-  if (bar && (location.pathname === '/' || location.pathname === '/dashboard')) {
-    const views = document.createElement('nav');
-    views.className = 'views';
-    const timeline = views.appendChild(document.createElement('a'));
+  // --- A link to the timeline from the dashboard (the launch screen has its own) ---
+  if (bar && location.pathname === '/dashboard' && !document.querySelector('a[href="/timeline"]')) {
+    const links = bar.querySelector('.links') || bar.appendChild(document.createElement('nav'));
+    links.className = 'links';
+    const timeline = links.appendChild(document.createElement('a'));
     timeline.href = '/timeline';
     timeline.textContent = 'Timeline';
-    bar.appendChild(views);
   }
 
   async function getJson(address) {

@@ -1,0 +1,42 @@
+#include "radio/EpsIdentity.h"
+
+#include <gtest/gtest.h>
+
+#include "platform/Value.h"
+namespace radio {
+namespace {
+
+using platform::Bytes;
+
+TEST(EpsIdentity, DecodesGutiAndTaiAndWritesThemInHex) {
+  const std::optional<Guti> guti =
+      decodeGuti(Bytes{0xF6, 0x13, 0x00, 0x62, 0x80, 0x01, 0x01, 0xC0, 0x00, 0x00, 0x01});
+  ASSERT_TRUE(guti);
+  EXPECT_EQ(*guti, (Guti{{"310", "260"}, 0x8001, 0x01, 0xC0000001}));
+  EXPECT_EQ(gutiText(*guti), "310-260-8001-01-C0000001");
+  EXPECT_EQ(gutiText(Guti{{"001", "01"}, 0x1, 0xAB, 0x12}), "001-01-0001-AB-00000012");
+
+  const std::optional<Tai> tai = decodeTai(Bytes{0x62, 0xF2, 0x10, 0x1A, 0x2B});
+  ASSERT_TRUE(tai);
+  EXPECT_EQ(*tai, (Tai{{"262", "01"}, 0x1A2B}));
+  EXPECT_EQ(taiText(*tai), "262-01-1A2B");
+  EXPECT_EQ(taiText(Tai{{"001", "01"}, 1}), "001-01-0001");
+}
+
+TEST(EpsIdentity, RefusesMalformedIdentities) {
+  const Bytes badGutis[] = {
+      {},
+      {0xF6, 0x13, 0x00, 0x62, 0x80, 0x01, 0x01, 0xC0, 0x00, 0x00},              // 10 bytes
+      {0xF6, 0x13, 0x00, 0x62, 0x80, 0x01, 0x01, 0xC0, 0x00, 0x00, 0x01, 0x00},  // 12 bytes
+      {0xF1, 0x13, 0x00, 0x62, 0x80, 0x01, 0x01, 0xC0, 0x00, 0x00, 0x01},        // an IMSI
+      {0xF6, 0x1A, 0x00, 0x62, 0x80, 0x01, 0x01, 0xC0, 0x00, 0x00, 0x01},        // bad PLMN
+  };
+  for (const Bytes& bytes : badGutis)
+    EXPECT_FALSE(decodeGuti(bytes)) << testing::PrintToString(bytes);
+  EXPECT_FALSE(decodeTai(Bytes{0x62, 0xF2, 0x10, 0x1A}));
+  EXPECT_FALSE(decodeTai(Bytes{0x62, 0xF2, 0x10, 0x1A, 0x2B, 0x00}));
+  EXPECT_FALSE(decodeTai(Bytes{0x62, 0xFF, 0x10, 0x1A, 0x2B}));
+}
+
+}  // namespace
+}  // namespace radio

@@ -374,8 +374,10 @@ constexpr Field kMmFields[] = {{"reg_status", ""},
 constexpr Field kGmmFields[] = {{"reg_status", ""},   {"update_status", ""},
                                 {"rai", ""},          {"proc_failure_cause", ""},
                                 {"reject_cause", ""}, {"reg_proc", ""}};
-constexpr Field kBearerFields[] = {{"bearer_contexts", ""}};
-constexpr Field kCarrierFields[] = {{"scc_list", ""}};
+constexpr std::string_view kBearerKeys[] = {"cid", "apn", "pdp_type"};
+constexpr Field kBearerFields[] = {{"bearer_contexts", "", kBearerKeys}};
+constexpr std::string_view kCarrierKeys[] = {"index", "state", "pci", "dl_earfcn"};
+constexpr Field kCarrierFields[] = {{"scc_list", "", kCarrierKeys}};
 
 // The RRC detectors run before the serving cell's, so that a cell change is judged by the state
 // that came with it.

@@ -35,9 +35,12 @@ enum class Subject : std::size_t {
 inline constexpr std::size_t kSubjectCount = static_cast<std::size_t>(Subject::Sim) + 1;
 
 // A watched field and what the event text calls it ("PCI"); no label leaves it out of the text.
+// Of a list of dictionaries, only the entries under `elementKeys` are watched, when it names
+// any: a carrier's state matters, its level of the moment does not.
 struct Field {
   std::string_view key;
   std::string_view label;
+  std::span<const std::string_view> elementKeys = {};
 };
 
 // A state change and what it means: the first rule whose states and cause match wins. Empty
@@ -72,7 +75,8 @@ struct Detector;
 using Memory = std::array<std::optional<platform::List>, kSubjectCount>;
 
 // What a detector sees: its last and its new watched value (its label, then its fields' values,
-// Null for a missing one), the decoded metric, and what every subject holds.
+// Null for a missing one, lists cut to their element keys), the decoded metric, and what every
+// subject holds.
 struct Change {
   const Detector& detector;
   const platform::List* before;  // null the first time

@@ -10,6 +10,7 @@ packages=(
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev modemmanager-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   libmosquitto-dev mosquitto openssl
+  libtomlplusplus-dev
   chromium nodejs
   tshark
 )

@@ -6,11 +6,6 @@
 
 namespace app {
 
-series::SeriesStore& viewerSeries() {
-  static series::SeriesStore* const shared = new series::SeriesStore();
-  return *shared;
-}
-
 void addDashboard(ui::DisplayOptions& display, store::MetricValidator& intake,
                   series::SeriesStore& series) {
   intake.addStoreObserver(

@@ -6,10 +6,6 @@
 
 namespace app {
 
-// The viewer's series store, created on first use and never released; it lives on the main
-// queue beside the intake's store.
-series::SeriesStore& viewerSeries();
-
 // The dashboard beside the screens: `series` is fed from `intake` after each metric's
 // conversion, and the pages get GET /dashboard (linked from the launch screen),
 // GET /api/series and GET /api/dashboard.

@@ -9,16 +9,22 @@
 #include "app/AppDelegate.h"
 #include "app/Dashboard.h"
 #include "app/MainInterface.h"
+#include "app/PageChrome.h"
+#include "app/RecordClock.h"
+#include "app/ReplayControls.h"
 #include "app/ServiceOption.h"
+#include "app/ViewerAlerts.h"
+#include "app/ViewerEvents.h"
 #include "app/ViewerOutput.h"
 #include "platform/CommandLine.h"
 #include "platform/Json.h"
 #include "platform/ParseNumber.h"
+#include "player/Drive.h"
+#include "series/SeriesStore.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
 #include "tarn/mm/ModemManagerSource.h"
 #include "tarn/mm/SourceOption.h"
-#include "tarn/replay/ReplaySource.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Application.h"
 #include "ui/web/ListenAddress.h"
@@ -27,7 +33,7 @@ namespace app {
 
 const std::string_view kViewerUsage =
     "usage: norvo [--listen ADDR:PORT] [--service WHERE] [--log FILE]\n"
-    "             [--replay LOG.jsonl [--speed X] [--loop]]\n"
+    "             [--replay LOG.jsonl [--speed X] [--loop]] [--alerts FILE]\n"
     "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
@@ -46,7 +52,8 @@ const std::string_view kViewerUsage =
     "                      that publishes to a broker (tarnd --publish)\n"
     "  --mqtt-ca FILE      the certificate authority of an mqtts:// broker\n"
     "  --replay LOG.jsonl  replay a metric log (see norvo record) instead of simulating; lines\n"
-    "                      that do not parse are reported and skipped\n"
+    "                      that do not parse are reported and skipped. Every page gets a\n"
+    "                      player bar to play, pause, change speed and seek\n"
     "  --speed X           replay X times as fast as recorded (default 1), or \"max\" for\n"
     "                      no pauses at all\n"
     "  --loop              start the log over after its last metric\n"
@@ -58,20 +65,26 @@ const std::string_view kViewerUsage =
     "  --log FILE          write the log lines to FILE; \"-\" writes them to standard output.\n"
     "                      On a terminal, Norvo shows one status line instead, and the lines\n"
     "                      go to $XDG_STATE_HOME/norvo/norvo.log (~/.local/state/norvo/)\n"
+    "  --alerts FILE       the alerts to watch for (TOML, see docs/events.md); without it,\n"
+    "                      ~/.config/norvo/alerts.toml if it exists, else the built-in ones\n"
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
     "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON and\n"
     "/api/store answers the whole store. /dashboard graphs the levels and shows the serving\n"
-    "cell; /api/series answers the graphs' series and /api/dashboard the serving cell.\n";
+    "cell; /api/series answers the graphs' series and /api/dashboard the serving cell.\n"
+    "/timeline lists what happened: RRC changes, handovers, radio link failures,\n"
+    "registrations, carriers, bearers (/api/events).\n";
 
 namespace {
 
 struct ViewerOptions {
   ui::DisplayOptions display;
   ServiceChoice service;
+  std::optional<std::string> alertsPath;
   std::optional<std::string> replayPath;
-  tarn::replay::ReplayOptions replay;
+  std::optional<double> replaySpeed = 1.0;  // empty: as fast as the intake takes the metrics
+  bool loop = false;
   std::optional<tarn::mm::ModemManagerOptions> modem;
   std::optional<std::string_view> log;
 };
@@ -83,7 +96,8 @@ std::nullopt_t refuse(std::string_view why) {
 
 // Empty, after saying why on standard error, when the arguments make no sense.
 std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile;
+  std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile,
+      alerts;
   bool loop = false;
   const platform::CommandLineOption table[] = {
       {"--listen", &listen, "an address and a port"},
@@ -95,6 +109,7 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
       {"--refresh", &refresh},
       {"--log", &log, "a file name, or - for standard output"},
       {"--mqtt-ca", &caFile, "a certificate file"},
+      {"--alerts", &alerts, "an alerts file"},
   };
   if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
     std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
@@ -118,12 +133,12 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
     options.service.caFile = std::string(*caFile);
   }
   if (speed == "max") {
-    options.replay.speed = std::nullopt;
+    options.replaySpeed = std::nullopt;
   } else if (speed) {
-    options.replay.speed = platform::parseSpeedFactor(*speed);
-    if (!options.replay.speed) return refuse("--speed wants a number above 0 or \"max\"");
+    options.replaySpeed = platform::parseSpeedFactor(*speed);
+    if (!options.replaySpeed) return refuse("--speed wants a number above 0 or \"max\"");
   }
-  options.replay.loop = loop;
+  options.loop = loop;
   if (replay && !options.service.builtIn()) {
     return refuse(
         "--replay goes with the built-in service; elsewhere, run\n"
@@ -149,19 +164,16 @@ std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> argu
     options.modem->refresh = *seconds;
   }
   options.log = log;
+  if (alerts) options.alertsPath = std::string(*alerts);
   return options;
 }
 
-// The metrics of the service inside Norvo: a modem, a replayed log, or the simulated phone.
+// The metrics of the service inside Norvo: a modem or the simulated phone.
 std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& options) {
   if (options.modem) {
     return std::make_shared<tarn::mm::ModemManagerSource>(
         *options.modem,
         [](const std::string& line) { std::cerr << "norvo: modemmanager: " << line << std::endl; });
-  }
-  if (options.replayPath) {
-    return std::make_shared<tarn::replay::ReplaySource>(*options.replayPath, options.replay,
-                                                        std::cerr);
   }
   // The same drive every run, so that what one user sees another can reproduce.
   constexpr std::uint64_t kDriveSeed = 1;
@@ -185,27 +197,61 @@ int runViewer(std::span<const std::string_view> arguments) {
   std::optional<ViewerOptions> options = parseOptions(arguments);
   if (!options) return 2;
 
+  // A replay plays on the main queue, so that it can seek; the service then has no source.
+  // Elsewhere, tarnd or the broker brings its own.
+  std::shared_ptr<tarn::service::MetricSource> source;
+  std::optional<player::Drive> drive;
   try {
-    std::shared_ptr<tarn::service::MetricSource> source;
-    // Elsewhere, tarnd brings its own.
-    if (options->service.builtIn()) source = builtInSource(*options);
+    if (options->replayPath) {
+      drive = player::readDrive(*options->replayPath, std::cerr);
+    } else if (options->service.builtIn()) {
+      source = builtInSource(*options);
+    }
     useService(options->service, std::move(source));
   } catch (const std::runtime_error& error) {
     std::cerr << "norvo: " << error.what() << '\n';
     return 1;
   }
 
+  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
+  RecordClock recordTime(intake);
+  series::SeriesStore levels([&recordTime] { return recordTime.nowMs(); });
   const std::unique_ptr<ViewerOutput> output =
-      ViewerOutput::open(options->log, sourceName(*options), viewerSeries());
+      ViewerOutput::open(options->log, sourceName(*options), levels);
   if (!output) return 1;
 
   ui::DisplayOptions display = std::move(options->display);
-  display.readings.emplace("store", [] {
-    return platform::toJson(store::dumpStore(store::MetricValidator::sharedInstance()));
-  });
-  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
-  addDashboard(display, intake, viewerSeries());
+  display.readings.emplace("store",
+                           [&intake] { return platform::toJson(store::dumpStore(intake)); });
+  addDashboard(display, intake, levels);
   output->wire(display, intake);
+  ViewerEvents events(intake);
+  events.addPages(display);
+  ViewerAlerts alerts(
+      viewerAlertRules(options->alertsPath),
+      [&levels](std::string_view name) -> std::optional<alerts::Reading> {
+        const auto latest = levels.latest(name);
+        if (!latest) return std::nullopt;
+        return alerts::Reading{latest->timeMs, latest->value};
+      },
+      intake, recordTime, events.ring(), !drive.has_value());
+  output->setAlertCount([&alerts] { return alerts.active().size(); });
+  std::optional<ReplayControls> replay;
+  if (drive) {
+    replay.emplace(std::move(*drive), options->replaySpeed, options->loop, intake, [&] {
+      intake.clearStore();
+      events.reset();
+      recordTime.reset();
+      levels.clear();
+      alerts.reset();
+    });
+    replay->addPages(display);
+    replay->start();
+  }
+  PageChrome chrome;
+  chrome.activeAlerts = [&alerts] { return alerts.active(); };
+  if (replay) chrome.replayState = [&replay] { return replay->stateDictionary(); };
+  chrome.addReading(display);
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

@@ -4,6 +4,7 @@
 #include <string_view>
 #include <vector>
 
+#include "app/EventsCommand.h"
 #include "app/ExportCommand.h"
 #include "app/FleetCommand.h"
 #include "app/IntakeCommand.h"
@@ -19,6 +20,7 @@ struct Command {
 
 constexpr Command kCommands[] = {
     {"export", &app::runExportCommand},
+    {"events", &app::runEventsCommand},
     {"intake", &app::runIntakeCommand},
     {"record", &app::runRecordCommand},
 };
@@ -30,6 +32,8 @@ constexpr std::string_view kCommandsUsage =
     "commands:\n"
     "  export LOG.jsonl --to pcapng|jsonl|csv [-o OUT] [--raw]\n"
     "      Write a metric log out for Wireshark, jq and pandas, or spreadsheets.\n"
+    "  events LOG.jsonl [--json]\n"
+    "      Find the events of a metric log: RRC changes, handovers, failures, registrations...\n"
     "  intake LOG.jsonl [--dump-store OUT.json]\n"
     "      Feed a metric log to the metric intake, print its log lines and write the store.\n"
     "  record OUT.jsonl [--to FORMAT] [--seconds N] [--seed S] [--speed X]\n"

@@ -114,6 +114,11 @@ void SeriesStore::storeDidUpdate(store::DisplayDictionary replaced,
   }
 }
 
+void SeriesStore::clear() {
+  for (SampleRing& ring : rings_)
+    ring = SampleRing(ring.capacity());
+}
+
 void SeriesStore::append(std::size_t series, std::int64_t timeMs, double value) {
   SampleRing& ring = rings_[series];
   ring.append(timeMs, static_cast<float>(value));

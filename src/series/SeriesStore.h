@@ -47,6 +47,9 @@ class SeriesStore {
   // The samples at or after `sinceMs`, oldest first, valid until the next append; empty for an
   // unknown name.
   std::optional<SampleRange> since(std::string_view name, std::int64_t sinceMs) const;
+  // Forgets every sample, as before the first metric: a replay that seeks starts over.
+  void clear();
+
   // How many samples a series holds at most.
   std::size_t capacity() const { return rings_.front().capacity(); }
 

@@ -124,11 +124,12 @@ const Handler* handlerFor(std::int64_t metricID) {
 }
 
 bool runHandler(const Handler& handler, const platform::Bytes* payload, DisplayStore& store,
-                const TimestampFormatter& formatTimestamp) {
+                const TimestampFormatter& formatTimestamp, const DecodedObserver& observeDecoded) {
   std::optional<Dictionary> decoded = handler.decode(payload);
   if (!decoded) return false;
   std::optional<Dictionary>& stored = store[handler.display];
   stored = std::move(decoded);
+  if (observeDecoded) observeDecoded(*stored);
   LastTimestampText lastText(formatTimestamp);
   // Holds a reference only, so it needs no allocation.
   const TimestampFormatter formatEachTimeOnce = [&lastText](double milliseconds) {

@@ -59,9 +59,18 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     platform::log::plain("I dont care for this Metric");
     return false;
   }
-  const platform::Value* payload = metric.find(payloadKey);
-  if (!runHandler(*handler, payload != nullptr ? payload->asBytes() : nullptr, store_,
-                  [this](double milliseconds) { return formatTimestamp(milliseconds); })) {
+  const platform::Value* payloadValue = metric.find(payloadKey);
+  const platform::Bytes* payload = payloadValue != nullptr ? payloadValue->asBytes() : nullptr;
+  DecodedObserver observeDecoded;
+  if (!acceptedMetricObservers_.empty()) {
+    observeDecoded = [this, payload](const platform::Dictionary& decoded) {
+      for (const AcceptedMetricObserver& observe : acceptedMetricObservers_)
+        observe(*metricID_, payload, decoded);
+    };
+  }
+  if (!runHandler(
+          *handler, payload, store_,
+          [this](double milliseconds) { return formatTimestamp(milliseconds); }, observeDecoded)) {
     return false;
   }
   for (const StoreObserver& observer : storeObservers_)

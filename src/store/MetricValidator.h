@@ -118,6 +118,13 @@ class MetricValidator : public TarnWrapperDelegate {
     return store_[which];
   }
 
+  // Back to the store of a new intake: no metric ID, no display dictionaries, placeholder rows.
+  // Observers stay.
+  void clearStore() {
+    metricID_.reset();
+    store_ = DisplayStore();
+  }
+
   // LTE downlink bandwidth index to MHz.
   const std::map<std::int32_t, float>& dlbwlookup() const;
 
@@ -131,6 +138,16 @@ class MetricValidator : public TarnWrapperDelegate {
   // converts it and stores the result. False for any other ID, or when the payload does not
   // decode; the store then keeps what it had.
   virtual bool isMetricIDValidWithMetricdict(const platform::Dictionary& metric);
+
+  // Sees each metric the intake accepts, on the main queue, once its payload has decoded and
+  // before the conversions rewrite its display dictionary: the metric ID, the payload (none
+  // when the record has none) and the dictionary as decoded. Observers must not keep the
+  // references, nor hand the intake another metric meanwhile.
+  using AcceptedMetricObserver = std::function<void(
+      std::int64_t metricID, const platform::Bytes* payload, const platform::Dictionary& decoded)>;
+  void addAcceptedMetricObserver(AcceptedMetricObserver observer) {
+    acceptedMetricObservers_.push_back(std::move(observer));
+  }
 
   // Told after each metric that changed the store, in the order added, which display dictionary
   // the metric replaced; the store is converted by then. What keeps data derived from the store
@@ -149,6 +166,7 @@ class MetricValidator : public TarnWrapperDelegate {
   TarnWrapper* const mySharedTarnInstance_;
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
+  std::vector<AcceptedMetricObserver> acceptedMetricObservers_;
   std::vector<StoreObserver> storeObservers_;
 };
 

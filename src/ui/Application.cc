@@ -17,8 +17,9 @@ namespace {
 struct Running {
   Running(const Storyboard& mainInterface, DisplayOptions& display)
       : pages(mainInterface, {}),
-        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings),
-                     std::move(display.queries), std::move(display.documents)}),
+        site(pages,
+             {!display.listen.address().is_loopback(), std::move(display.readings),
+              std::move(display.queries), std::move(display.documents), std::move(display.routes)}),
         server(platform::mainQueue(),
                [this](const web::Request& request) { return site.handle(request); }, {}),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}

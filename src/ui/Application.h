@@ -39,6 +39,8 @@ struct DisplayOptions {
   std::vector<web::Site::Document> documents;
   // Told, on the main queue, the address to open once the pages are served.
   std::function<void(const std::string& address)> didStartServing;
+  // Pages and APIs the app answers itself, by path (see web/Site.h).
+  std::map<std::string, web::Site::Route, std::less<>> routes;
 };
 
 // Runs the application on the main queue until it is asked to stop: makes the window and its

@@ -3,6 +3,7 @@
 
 const { spawn } = require('node:child_process');
 const fs = require('node:fs');
+const net = require('node:net');
 const os = require('node:os');
 const path = require('node:path');
 const { chromium } = require('playwright-core');
@@ -12,9 +13,55 @@ const program = process.env.NORVO ?? path.join(repository, 'build', 'src', 'app'
 const browserPath = process.env.CHROMIUM ?? '/usr/bin/chromium';
 const artifacts = process.env.ARTIFACTS ?? path.join(repository, 'test-artifacts');
 
-// Resolves with Norvo's address once it has printed it.
-function startNorvo() {
-  return startProgram(['--listen', '127.0.0.1:0'], /Open (http:\/\/127\.0\.0\.1:\d+)\/ in a browser/);
+// A loopback port that is free now.
+function freePort() {
+  return new Promise((resolve, reject) => {
+    const server = net.createServer();
+    server.on('error', reject);
+    server.listen(0, '127.0.0.1', () => {
+      const { port } = server.address();
+      server.close(() => resolve(port));
+    });
+  });
+}
+
+// Resolves with the address once Norvo answers there: a Norvo that soon falls quiet (a replay)
+// may hold the line that names its address in its output's buffer.
+async function answering(address, exited) {
+  const deadline = Date.now() + 30000;
+  let gone = false;
+  exited.then(() => {
+    gone = true;
+  });
+  while (!gone && Date.now() < deadline) {
+    try {
+      if ((await fetch(address + '/api/chrome')).ok) return address;
+    } catch (error) {
+      // Not listening yet.
+    }
+    await new Promise((resolve) => setTimeout(resolve, 100));
+  }
+  throw new Error(gone ? 'norvo exited early' : `norvo did not answer at ${address} within 30 s`);
+}
+
+// Resolves with Norvo's address once it has printed it, or, given a port, once it answers
+// there. `args` go after the address.
+function startNorvo(args = [], { port } = {}) {
+  if (!port) {
+    return startProgram(['--listen', '127.0.0.1:0', ...args],
+                        /Open (http:\/\/127\.0\.0\.1:\d+)\/ in a browser/);
+  }
+  const child = spawn(program, ['--listen', `127.0.0.1:${port}`, ...args], {
+    stdio: ['ignore', 'ignore', 'inherit'],
+  });
+  const exited = new Promise((resolve) => child.on('exit', (code, signal) => resolve({ code, signal })));
+  return {
+    address: answering(`http://127.0.0.1:${port}`, exited),
+    async stop() {
+      child.kill('SIGINT');
+      return exited;
+    },
+  };
 }
 
 // Runs Norvo with `args`; `addressLine` finds the address it prints.
@@ -74,4 +121,4 @@ async function screenshot(page, name) {
   await page.screenshot({ path: path.join(artifacts, `${name}.png`) });
 }
 
-module.exports = { startNorvo, startProgram, startBrowser, screenshot, program };
+module.exports = { program, freePort, startNorvo, startProgram, startBrowser, screenshot };

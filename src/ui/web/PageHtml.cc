@@ -78,8 +78,11 @@ std::string renderHtml(const PageView& page) {
   std::string out;
   out.reserve(4096);
   openDocument(out, page.title);
+  // The chrome beside the table: links to the other views, alerts and a replay's player bar.
   out +=
-      "<script src=\"/assets/norvo.js\" defer></script>\n</head>\n<body>\n<header class=\"bar\">";
+      "<link rel=\"stylesheet\" href=\"/assets/chrome.css\">\n"
+      "<script src=\"/assets/norvo.js\" defer></script>\n"
+      "<script src=\"/assets/chrome.js\" defer></script>\n</head>\n<body>\n<header class=\"bar\">";
   if (page.back) {
     out += "<a class=\"back\" href=\"";
     appendEscaped(out, page.back->href);

@@ -53,12 +53,14 @@ Response Site::handle(const Request& request) {
 }
 
 Response Site::route(const Request& request, std::string_view path) {
-  if (request.method() != http::verb::get && request.method() != http::verb::head)
-    return error(request, http::status::method_not_allowed, formatFor(path));
   if (!hostAllowed(request))
     return error(request, http::status::misdirected_request, formatFor(path));
   if (request.target().size() > kMaxTarget)
     return error(request, http::status::uri_too_long, formatFor(path));
+  if (const auto own = options_.routes.find(path); own != options_.routes.end())
+    return own->second(request);
+  if (request.method() != http::verb::get && request.method() != http::verb::head)
+    return error(request, http::status::method_not_allowed, formatFor(path));
   if (!path.starts_with('/')) return error(request, http::status::bad_request, ErrorFormat::Html);
 
   if (path.starts_with(kAssets)) return asset(request, path.substr(kAssets.size()));

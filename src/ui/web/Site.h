@@ -12,8 +12,8 @@
 
 namespace ui::web {
 
-// What the browser and scripts can ask for. Every answer is a pure reading: no request changes
-// what the screens show.
+// What the browser and scripts can ask for. Every answer but the app's own routes is a pure
+// reading: no request changes what the screens show.
 //
 //   GET /                     the root screen, as a page
 //   GET /LTE/CA%20Status      the screen reached by tapping those rows, as a page
@@ -21,10 +21,14 @@ namespace ui::web {
 //   GET /api/<name>?<query>   one of the data readings the app adds, as JSON
 //   GET /assets/<name>        the style sheet, script and icon of the pages
 //   GET /dashboard            a document the app adds (any address it chooses)
+//   any /api/replay           an address the app answers itself, whatever the method
 class Site {
  public:
   // Produces the JSON text of one data reading.
   using Reading = std::function<std::string()>;
+  // Answers every request for its path, whatever the method; it refuses the methods it does not
+  // take itself. Runs on the main queue.
+  using Route = std::function<Response(const Request& request)>;
 
   // The JSON of a reading that takes parameters, or why it cannot answer.
   struct QueryAnswer {
@@ -51,6 +55,8 @@ class Site {
     // whose escapes are broken is refused before it gets there.
     std::map<std::string, Query, std::less<>> queries;
     std::vector<Document> documents;
+    // By path: "/api/replay" answers every request for /api/replay. Routes come first.
+    std::map<std::string, Route, std::less<>> routes;
   };
 
   Site(OpenPages& pages, Options options);

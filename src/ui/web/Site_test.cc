@@ -8,6 +8,7 @@
 #include "ui/testing/TestScreens.h"
 #include "ui/web/Assets.h"
 #include "ui/web/OpenPages.h"
+#include "ui/web/Responses.h"
 
 namespace ui::web {
 namespace {
@@ -38,7 +39,16 @@ class ASite : public ::testing::Test {
 
   Storyboard board = testing::testStoryboard();
   OpenPages pages{board, {}};
-  Site site{pages, {false, {{"store", [] { return std::string(R"({"a":1})"); }}}, {}, {}}};
+  Site site{pages,
+            {false,
+             {{"store", [] { return std::string(R"({"a":1})"); }}},
+             {},
+             {},
+             {{"/mine", [](const Request& request) {
+                 return makeResponse(http::status::accepted, "text/plain",
+                                     std::string(request.method_string()), request.version(),
+                                     request.keep_alive());
+               }}}}};
 };
 
 TEST_F(ASite, ShowsTheRootScreenAsAPageWhoseRowsLinkToTheScreensTheyLeadTo) {
@@ -131,10 +141,21 @@ TEST_F(ASite, AnswersOnlyForLoopbackHostNamesUnlessToldOtherwise) {
        {"evil.example", "evil.example:8080", "10.0.0.1:8080", "[::1", "localhost.evil"})
     EXPECT_EQ(get("/", host).result(), http::status::misdirected_request) << host;
 
-  Site open(pages, {true, {}, {}, {}});
+  Site open(pages, {true, {}, {}, {}, {}});
   Request request(http::verb::get, "/", 11);
   request.set(http::field::host, "viewer.example:8080");
   EXPECT_EQ(open.handle(request).result(), http::status::ok);
+}
+
+TEST_F(ASite, HandsEveryMethodForTheAppsOwnRoutesToThem) {
+  for (const http::verb method : {http::verb::get, http::verb::post, http::verb::put}) {
+    const Response response = get("/mine", "localhost", method);
+    EXPECT_EQ(response.result(), http::status::accepted);
+    EXPECT_EQ(response.body(), http::to_string(method));
+  }
+  EXPECT_EQ(get("/mine", "evil.example", http::verb::post).result(),
+            http::status::misdirected_request);
+  EXPECT_EQ(get("/mine/more").result(), http::status::not_found);
 }
 
 TEST_F(ASite, AnswersHeadWithTheLengthButNoBody) {
@@ -199,8 +220,8 @@ class ASiteWithPagesOfItsOwn : public ASite {
     return {http::status::ok, "{\"name\":\"" + name->second + "\"}", {}};
   }
 
-  Site withPages{pages,
-                 {false, {}, {{"echo", &echo}}, {{"/dashboard", "dashboard.html", "Dashboard"}}}};
+  Site withPages{
+      pages, {false, {}, {{"echo", &echo}}, {{"/dashboard", "dashboard.html", "Dashboard"}}, {}}};
 
   Response getFrom(Site& answering, std::string target) {
     Request request(http::verb::get, target, 11);

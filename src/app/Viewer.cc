@@ -14,6 +14,8 @@
 #include "platform/ParseNumber.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
+#include "tarn/client/Drops.h"
+#include "tarn/flow/DropTally.h"
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Application.h"
@@ -45,8 +47,8 @@ const std::string_view kViewerUsage =
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
-    "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON and\n"
-    "/api/store answers the whole store.\n";
+    "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON,\n"
+    "/api/store answers the whole store and /api/status what was dropped under overload.\n";
 
 namespace {
 
@@ -62,22 +64,15 @@ std::nullopt_t refuse(std::string_view why) {
   return std::nullopt;
 }
 
-// Empty, after saying why on standard error, when the arguments make no sense.
-std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
+// The arguments of the viewer, as given.
+struct GivenOptions {
   std::optional<std::string_view> listen, service, replay, speed;
   bool loop = false;
-  const platform::CommandLineOption table[] = {
-      {"--listen", &listen, "an address and a port"},
-      {"--service", &service},
-      {"--replay", &replay, "a metric log"},
-      {"--speed", &speed},
-      {"--loop", &loop},
-  };
-  if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
-    std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
-    return std::nullopt;
-  }
+};
 
+// Empty, after saying why on standard error, when the values make no sense.
+std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
+  const auto& [listen, service, replay, speed, loop] = given;
   ViewerOptions options;
   if (listen) {
     const auto endpoint = ui::web::parseListenAddress(*listen);
@@ -117,14 +112,33 @@ std::shared_ptr<tarn::service::MetricSource> builtInSource(const ViewerOptions& 
   return std::make_shared<tarn::sim::SimulatorSource>(kDriveSeed);
 }
 
+// How the viewer keeps up: the events its session dropped because it fell behind, by kind.
+platform::Dictionary viewerStatus() {
+  platform::Dictionary dropped;
+  std::uint64_t total = 0;
+  for (const auto& [kind, count] : tarn::client::droppedEvents()) {
+    dropped.append(tarn::flow::kindName(kind), count);
+    total += count;
+  }
+  return {{"dropped_events", total}, {"dropped_by_kind", std::move(dropped)}};
+}
+
 }  // namespace
 
 int runViewer(std::span<const std::string_view> arguments) {
-  if (platform::asksForHelp(arguments)) {
-    std::cout << kViewerUsage;
-    return 0;
+  GivenOptions given;
+  const platform::CommandLineOption table[] = {
+      {"--listen", &given.listen, "an address and a port"},
+      {"--service", &given.service},
+      {"--replay", &given.replay, "a metric log"},
+      {"--speed", &given.speed},
+      {"--loop", &given.loop},
+  };
+  if (const auto exit = platform::openCommandLine({"norvo", kViewerUsage}, arguments, table, {},
+                                                  std::cout, std::cerr)) {
+    return *exit;
   }
-  std::optional<ViewerOptions> options = parseOptions(arguments);
+  std::optional<ViewerOptions> options = judgeOptions(given);
   if (!options) return 2;
 
   std::shared_ptr<tarn::service::MetricSource> source;
@@ -142,6 +156,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   display.readings.emplace("store", [] {
     return platform::toJson(store::dumpStore(store::MetricValidator::sharedInstance()));
   });
+  display.readings.emplace("status", [] { return platform::toJson(viewerStatus()); });
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

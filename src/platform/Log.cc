@@ -68,6 +68,20 @@ void system(std::string_view line) {
   }
 }
 
+void warning(std::string_view line) {
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (!channels.captures.empty()) {
+    channels.captures.back()->systemLines_.emplace_back(line);
+    return;
+  }
+  std::string whole(line);
+  whole += '\n';
+  // Unbuffered, so that the line is out even if the process is about to end.
+  std::fwrite(whole.data(), 1, whole.size(), stderr);
+  writeToSystemLog(channels, line);
+}
+
 Capture::Capture() {
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);

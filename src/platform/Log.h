@@ -13,6 +13,10 @@ namespace platform::log {
 
 void plain(std::string_view line);
 void system(std::string_view line);
+// Something a person must see, such as a feature that stopped or data that was lost: written to
+// standard error and to the system log, where one is running. A Capture keeps it among its
+// system lines.
+void warning(std::string_view line);
 
 template <class... Args>
 void plainf(std::string_view pattern, const Args&... arguments) {
@@ -22,6 +26,11 @@ void plainf(std::string_view pattern, const Args&... arguments) {
 template <class... Args>
 void systemf(std::string_view pattern, const Args&... arguments) {
   system(format(pattern, arguments...));
+}
+
+template <class... Args>
+void warningf(std::string_view pattern, const Args&... arguments) {
+  warning(format(pattern, arguments...));
 }
 
 // While a Capture is alive, the lines of both channels go to it instead of to standard output
@@ -42,6 +51,7 @@ class Capture {
  private:
   friend void plain(std::string_view line);
   friend void system(std::string_view line);
+  friend void warning(std::string_view line);
 
   std::vector<std::string> plainLines_;
   std::vector<std::string> systemLines_;

@@ -44,8 +44,8 @@ int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterfa
 
     running = std::make_unique<Running>(mainInterface, display);
     if (const auto error = running->server.listen(display.listen)) {
-      platform::log::plainf("Cannot listen on %s: %s", web::browserAddress(display.listen),
-                            error.message());
+      platform::log::warningf("Cannot listen on %s: %s", web::browserAddress(display.listen),
+                              error.message());
       status = 1;
       platform::stopMainQueue();
       return;

@@ -55,7 +55,7 @@ class RecordingSourceTest : public ::testing::Test {
   // handed on to the service.
   std::vector<Metric> recordThrough(const std::vector<Metric>& metrics,
                                     std::chrono::milliseconds ago = 0ms) {
-    RecordingSource recorder(scripted_, log_, RecordingSource::Clock::now() - ago);
+    RecordingSource recorder(scripted_, log_, "the log", RecordingSource::Clock::now() - ago);
     std::vector<Metric> handedOn;
     recorder.start([&handedOn](Metric metric) { handedOn.push_back(std::move(metric)); });
     for (const Metric& metric : metrics)

@@ -1,6 +1,7 @@
 #include "tarn/log/MetricLog.h"
 
 #include <algorithm>
+#include <boost/json/monotonic_resource.hpp>
 #include <boost/json/parse.hpp>
 #include <boost/json/value.hpp>
 #include <cmath>
@@ -109,7 +110,9 @@ ParsedLine parseMetricLogLine(std::string_view line, const MetricLogLimits& limi
     return failure(platform::format("more than %zu keys", limits.keys));
   }
   boost::system::error_code error;
-  const boost::json::value json = boost::json::parse(line, error);
+  // The parsed tree lives only while the line is converted: one arena, freed at once.
+  boost::json::monotonic_resource arena;
+  const boost::json::value json = boost::json::parse(line, error, &arena);
   if (error) return failure("not JSON (" + error.message() + ")");
   if (!json.is_object()) return failure("not a JSON object");
 

@@ -1,5 +1,8 @@
 #include "app/Viewer.h"
 
+#include <algorithm>
+#include <cctype>
+#include <fstream>
 #include <iostream>
 #include <memory>
 #include <optional>
@@ -10,7 +13,9 @@
 #include "app/MainInterface.h"
 #include "app/ServiceOption.h"
 #include "platform/CommandLine.h"
+#include "platform/Format.h"
 #include "platform/Json.h"
+#include "platform/Log.h"
 #include "platform/ParseNumber.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
@@ -19,12 +24,13 @@
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Application.h"
+#include "ui/web/Access.h"
 #include "ui/web/ListenAddress.h"
 
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT] [--service WHERE]\n"
+    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]] [--service WHERE]\n"
     "             [--replay LOG.jsonl [--speed X] [--loop]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
@@ -35,7 +41,11 @@ const std::string_view kViewerUsage =
     "options:\n"
     "  --listen ADDR:PORT  where to serve the pages (default 127.0.0.1:8080). Only loopback\n"
     "                      addresses are private; 0.0.0.0:8080 shows the pages to the whole\n"
-    "                      network. Port 0 takes any free port.\n"
+    "                      network, to those who hold its access token: Norvo makes one\n"
+    "                      at start and prints the address with it. Port 0 takes any\n"
+    "                      free port.\n"
+    "  --token-file FILE   the access token to ask for, from FILE, instead of a new one\n"
+    "  --no-auth           show the pages beyond loopback to anyone, with no token\n"
     "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
     "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
     "                      or \"dbus:ADDRESS\" on another bus\n"
@@ -66,18 +76,58 @@ std::nullopt_t refuse(std::string_view why) {
 
 // The arguments of the viewer, as given.
 struct GivenOptions {
-  std::optional<std::string_view> listen, service, replay, speed;
+  std::optional<std::string_view> listen, service, replay, speed, tokenFile;
   bool loop = false;
+  bool noAuth = false;
 };
+
+// The access token in `path`: its first line, which may hold only what an address and a cookie
+// carry as they are.
+std::optional<std::string> readToken(std::string_view path) {
+  std::ifstream file{std::string(path)};
+  std::string token;
+  if (!file || !std::getline(file, token)) return std::nullopt;
+  while (!token.empty() && std::isspace(static_cast<unsigned char>(token.back())))
+    token.pop_back();
+  const bool plain = std::all_of(token.begin(), token.end(), [](char c) {
+    return std::isalnum(static_cast<unsigned char>(c)) || c == '-' || c == '.' || c == '_' ||
+           c == '~';
+  });
+  if (token.empty() || !plain) return std::nullopt;
+  return token;
+}
 
 // Empty, after saying why on standard error, when the values make no sense.
 std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
-  const auto& [listen, service, replay, speed, loop] = given;
+  const auto& [listen, service, replay, speed, tokenFile, loop, noAuth] = given;
   ViewerOptions options;
   if (listen) {
     const auto endpoint = ui::web::parseListenAddress(*listen);
     if (!endpoint) return refuse("--listen wants an address and a port, such as 127.0.0.1:8080");
     options.display.listen = *endpoint;
+  }
+  if (tokenFile && noAuth) return refuse("--token-file and --no-auth exclude each other");
+  if (tokenFile) {
+    options.display.token = readToken(*tokenFile);
+    if (!options.display.token) {
+      return refuse(platform::format(
+          "--token-file %s: the file's first line must hold the token, made of letters, digits "
+          "and - . _ ~",
+          *tokenFile));
+    }
+  } else if (!options.display.listen.address().is_loopback()) {
+    if (noAuth) {
+      platform::log::warningf(
+          "norvo: --no-auth: anyone who can reach %s sees every page and /api/store (IMSI, "
+          "ICCID, IMEI, APNs, addresses)",
+          *listen);
+    } else {
+      try {
+        options.display.token = ui::web::Access::makeToken();
+      } catch (const std::runtime_error& error) {
+        return refuse(error.what());
+      }
+    }
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);
@@ -133,6 +183,8 @@ int runViewer(std::span<const std::string_view> arguments) {
       {"--replay", &given.replay, "a metric log"},
       {"--speed", &given.speed},
       {"--loop", &given.loop},
+      {"--token-file", &given.tokenFile, "a file name"},
+      {"--no-auth", &given.noAuth},
   };
   if (const auto exit = platform::openCommandLine({"norvo", kViewerUsage}, arguments, table, {},
                                                   std::cout, std::cerr)) {

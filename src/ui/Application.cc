@@ -17,7 +17,8 @@ namespace {
 struct Running {
   Running(const Storyboard& mainInterface, DisplayOptions& display)
       : pages(mainInterface, {}),
-        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings)}),
+        site(pages,
+             {!display.listen.address().is_loopback(), std::move(display.readings), display.token}),
         server(platform::mainQueue(),
                [this](const web::Request& request) { return site.handle(request); }, {}),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}
@@ -50,8 +51,9 @@ int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterfa
       platform::stopMainQueue();
       return;
     }
-    platform::log::plainf("Open %s in a browser; Ctrl-C stops.",
-                          web::browserAddress(running->server.localEndpoint()));
+    std::string address = web::browserAddress(running->server.localEndpoint());
+    if (display.token) address += "?" + std::string(web::Access::kQueryKey) + "=" + *display.token;
+    platform::log::plainf("Open %s in a browser; Ctrl-C stops.", address);
     running->signals.async_wait([&](const boost::system::error_code& error, int) {
       if (error) return;
       delegate.applicationWillTerminate();

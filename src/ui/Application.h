@@ -31,6 +31,9 @@ struct DisplayOptions {
   boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
   // Extra JSON readings under /api/<name>.
   std::map<std::string, web::Site::Reading, std::less<>> readings;
+  // When set, every page and reading needs this access token; the address printed at start
+  // carries it.
+  std::optional<std::string> token;
 };
 
 // Runs the application on the main queue until it is asked to stop: makes the window and its

@@ -46,7 +46,9 @@ bool isLoopbackHost(std::string_view host) {
 
 }  // namespace
 
-Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {}
+Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {
+  if (options_.token) access_.emplace(*options_.token);
+}
 
 Response Site::handle(const Request& request) {
   const std::string_view target = request.target();
@@ -70,6 +72,9 @@ Response Site::route(const Request& request, std::string_view path) {
     return error(request, http::status::method_not_allowed, formatFor(path));
   if (!hostAllowed(request))
     return error(request, http::status::misdirected_request, formatFor(path));
+  if (access_) {
+    if (std::optional<Response> refusal = access_->check(request)) return std::move(*refusal);
+  }
   if (request.target().size() > kMaxTarget)
     return error(request, http::status::uri_too_long, formatFor(path));
   if (!path.starts_with('/')) return error(request, http::status::bad_request, ErrorFormat::Html);

@@ -2,9 +2,11 @@
 
 #include <functional>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 
+#include "ui/web/Access.h"
 #include "ui/web/Http.h"
 #include "ui/web/OpenPages.h"
 
@@ -29,6 +31,8 @@ class Site {
     bool anyHost = false;
     // By name: "store" answers GET /api/store.
     std::map<std::string, Reading, std::less<>> readings;
+    // When set, every answer needs this access token (see Access.h).
+    std::optional<std::string> token = std::nullopt;
   };
 
   Site(OpenPages& pages, Options options);
@@ -45,6 +49,7 @@ class Site {
 
   OpenPages& pages_;
   Options options_;
+  std::optional<Access> access_;
 };
 
 }  // namespace ui::web

@@ -58,16 +58,19 @@ Input wireMessage(Random& random, int depth) {
         putVarint(out, random.next() >> random.below(64));
         break;
       case 1:
-        for (int b = 0; b < 8; ++b) out.push_back(static_cast<std::uint8_t>(random.next()));
+        for (int b = 0; b < 8; ++b)
+          out.push_back(static_cast<std::uint8_t>(random.next()));
         break;
       case 2: {
-        const Input inner = random.below(2) == 0 ? wireMessage(random, depth + 1) : Input(random.below(6), 0x81);
+        const Input inner =
+            random.below(2) == 0 ? wireMessage(random, depth + 1) : Input(random.below(6), 0x81);
         putVarint(out, inner.size());
         out.insert(out.end(), inner.begin(), inner.end());
         break;
       }
       case 5:
-        for (int b = 0; b < 4; ++b) out.push_back(static_cast<std::uint8_t>(random.next()));
+        for (int b = 0; b < 4; ++b)
+          out.push_back(static_cast<std::uint8_t>(random.next()));
         break;
       default:
         break;
@@ -98,11 +101,14 @@ Input mutated(Input input, Random& random) {
   return input;
 }
 
-void run(const Input& input) { LLVMFuzzerTestOneInput(input.data(), input.size()); }
+void run(const Input& input) {
+  LLVMFuzzerTestOneInput(input.data(), input.size());
+}
 
 void replay(const std::filesystem::path& path) {
   if (std::filesystem::is_directory(path)) {
-    for (const auto& entry : std::filesystem::directory_iterator(path)) replay(entry.path());
+    for (const auto& entry : std::filesystem::directory_iterator(path))
+      replay(entry.path());
     return;
   }
   std::ifstream file(path, std::ios::binary);

@@ -10,6 +10,7 @@ packages=(
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev
   libgtest-dev libgmock-dev libbenchmark-dev
   chromium nodejs
+  clang libclang-rt-14-dev
 )
 
 missing=()

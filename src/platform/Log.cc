@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <climits>
 #include <cstdio>
 #include <mutex>
@@ -46,9 +47,24 @@ void writeToSystemLog(Channels& channels, std::string_view line) {
   syslog(LOG_NOTICE, "%.*s", length, line.data());
 }
 
+std::atomic<int> silences{0};
+
 }  // namespace
 
+Silence::Silence() {
+  ++silences;
+}
+
+Silence::~Silence() {
+  --silences;
+}
+
+bool silenced() {
+  return silences.load(std::memory_order_relaxed) > 0;
+}
+
 void plain(std::string_view line) {
+  if (silenced()) return;
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.captures.empty()) {
@@ -59,6 +75,7 @@ void plain(std::string_view line) {
 }
 
 void system(std::string_view line) {
+  if (silenced()) return;
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.captures.empty()) {
@@ -69,6 +86,7 @@ void system(std::string_view line) {
 }
 
 void warning(std::string_view line) {
+  if (silenced()) return;
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (!channels.captures.empty()) {

@@ -147,6 +147,20 @@ TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoe
   EXPECT_EQ(norvo->stop(SIGINT, 10s), 0) << norvo->standardError();
 }
 
+TEST_F(OverloadTest, TheIntakeFailsWhenItsLogLinesCannotBeWritten) {
+  auto intake = std::make_unique<ChildProcess>(ChildProcess::Options{
+      .arguments = {NORVO_VIEWER, "intake", drive()},
+      .standardOutput = "/dev/full",
+      .standardError = file("full.err"),
+      .descriptor3 = std::nullopt,
+  });
+  EXPECT_EQ(intake->wait(60s), 1);
+  EXPECT_NE(intake->standardError().find("norvo intake: cannot write the log lines to standard "
+                                         "output: No space left on device"),
+            std::string::npos)
+      << intake->standardError();
+}
+
 TEST_F(OverloadTest, ALoopingReplayWithoutPausesStaysSmallAnswersEveryPageAndEndsOnASignal) {
   for (const int signal : {SIGINT, SIGTERM}) {
     const int port = freePort();

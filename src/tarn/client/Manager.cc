@@ -5,7 +5,6 @@
 #include <vector>
 
 #include "platform/Log.h"
-#include "tarn/Names.h"
 #include "tarn/client/Drops.h"
 #include "tarn/flow/DropTally.h"
 #include "tarn/flow/KindQueue.h"
@@ -18,14 +17,6 @@ namespace {
 // past kMostWaiting the oldest event of the most frequent kind is dropped for each new one.
 constexpr std::size_t kMostWaiting = 4096;
 constexpr std::size_t kFallingBehind = 512;
-
-// Metrics are of the kind of their metric ID; every other event is of kind 0.
-std::uint64_t kindOf(std::string_view event, const ipc::Object& object) {
-  if (event != kEventMetric) return 0;
-  const ipc::Object* metricId = object.find(kKeyMetricID);
-  const std::int64_t* value = metricId != nullptr ? metricId->asInteger() : nullptr;
-  return value != nullptr && *value > 0 ? static_cast<std::uint64_t>(*value) : 0;
-}
 
 }  // namespace
 
@@ -47,7 +38,7 @@ class Manager::Events : public std::enable_shared_from_this<Events> {
     bool keepingUp = true;
     {
       const std::lock_guard lock(mutex_);
-      const std::uint64_t kind = kindOf(event, object);
+      const std::uint64_t kind = flow::kindOfEvent(event, object);
       if (const auto dropped = pending_.push(kind, {std::string(event), std::move(object)})) {
         drops_.count(*dropped);
         countDroppedEvent(*dropped);

@@ -5,7 +5,6 @@
 
 #include "platform/Format.h"
 #include "platform/Log.h"
-#include "tarn/Names.h"
 #include "tarn/dbus/Interface.h"
 
 namespace tarn::dbus {
@@ -17,13 +16,6 @@ namespace {
 // kFallingBehind the source is held back.
 constexpr std::size_t kMaxQueuedEvents = 100'000;
 constexpr std::size_t kFallingBehind = 10'000;
-
-std::uint64_t kindOf(std::string_view event, const ipc::Object& record) {
-  if (event != kEventMetric) return 0;
-  const ipc::Object* metricId = record.find(kKeyMetricID);
-  const std::int64_t* value = metricId != nullptr ? metricId->asInteger() : nullptr;
-  return value != nullptr && *value > 0 ? static_cast<std::uint64_t>(*value) : 0;
-}
 
 const std::string kManager(kManagerInterface);
 const std::string kSession(kSessionInterface);
@@ -214,7 +206,7 @@ bool Service::queue(service::Core::SessionId session, std::string_view event, ip
   bool keepingUp = true;
   {
     const std::lock_guard lock(outgoingMutex_);
-    const std::uint64_t kind = kindOf(event, record);
+    const std::uint64_t kind = flow::kindOfEvent(event, record);
     if (const auto dropped =
             outgoing_.push(kind, {session, {std::string(event), std::move(record)}})) {
       drops_.count(*dropped);

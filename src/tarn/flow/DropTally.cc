@@ -1,6 +1,7 @@
 #include "tarn/flow/DropTally.h"
 
 #include "platform/Format.h"
+#include "tarn/Names.h"
 
 namespace tarn::flow {
 
@@ -18,6 +19,13 @@ std::optional<std::string> DropTally::report(Clock::time_point now) {
   lastReport_ = now;
   return platform::format("%s: fell behind; dropped %llu event(s), the oldest of their kind: %s",
                           who_, total, kinds);
+}
+
+std::uint64_t kindOfEvent(std::string_view event, const ipc::Object& object) {
+  if (event != kEventMetric) return 0;
+  const ipc::Object* metricId = object.find(kKeyMetricID);
+  const std::int64_t* value = metricId != nullptr ? metricId->asInteger() : nullptr;
+  return value != nullptr && *value > 0 ? static_cast<std::uint64_t>(*value) : 0;
 }
 
 std::string kindName(std::uint64_t kind) {

@@ -7,6 +7,8 @@
 #include <string>
 #include <string_view>
 
+#include "tarn/Ipc.h"
+
 namespace tarn::flow {
 
 // Counts the items a bounded queue dropped, by kind, and words them for a log line at most once
@@ -31,6 +33,9 @@ class DropTally {
   std::map<std::uint64_t, std::uint64_t> sinceReport_;
   std::optional<Clock::time_point> lastReport_;
 };
+
+// The kind of an event: its metric ID for a metric, 0 for any other event.
+std::uint64_t kindOfEvent(std::string_view event, const ipc::Object& object);
 
 // The name of an event kind in reports: a metric ID in hex, or "events" for the events that are
 // no metric (kind 0).

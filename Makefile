@@ -3,12 +3,14 @@
 
 BUILD      ?= build
 ASAN_BUILD ?= build-asan
+FUZZ_BUILD ?= build-fuzz
+FUZZ_SECONDS ?= 60
 JOBS       ?= $(shell nproc)
 CMAKE_ARGS ?=
 
 configure = test -f $(1)/build.ninja || cmake -S . -B $(1) -G Ninja $(2) $(CMAKE_ARGS)
 
-.PHONY: all deps build build-asan test unit-test asan-test fuzz-smoke bench run format format-check tidy clean
+.PHONY: all deps build build-asan test unit-test asan-test fuzz-smoke fuzz bench run format format-check tidy clean
 
 all: build
 
@@ -36,6 +38,12 @@ asan-test: build-asan
 	cd $(ASAN_BUILD) && ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
 		ctest --output-on-failure -j $(JOBS)
 
+# Each fuzz target under libFuzzer, AddressSanitizer and UndefinedBehaviorSanitizer for
+# FUZZ_SECONDS, from its seed corpus in fuzz/corpus; prints the executions run.
+fuzz: deps
+	@$(call configure,$(FUZZ_BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo -DCMAKE_CXX_COMPILER=clang++ -DNORVO_LIBFUZZER=ON -DNORVO_SANITIZE=ON -DNORVO_BENCHMARKS=OFF)
+	FUZZ_SECONDS=$(FUZZ_SECONDS) cmake --build $(FUZZ_BUILD) -j $(JOBS) --target fuzz
+
 bench: build
 	cmake --build $(BUILD) --target bench
 
@@ -55,4 +63,4 @@ tidy: build
 	run-clang-tidy -quiet -p $(BUILD) '$(CURDIR)/(src|tools|tests|bench|fuzz)/.*\.cc$$'
 
 clean:
-	rm -rf $(BUILD) $(ASAN_BUILD)
+	rm -rf $(BUILD) $(ASAN_BUILD) $(FUZZ_BUILD)

@@ -13,6 +13,7 @@ packages=(
   libtomlplusplus-dev
   chromium nodejs
   tshark
+  clang libclang-rt-14-dev
 )
 
 missing=()

@@ -1,6 +1,8 @@
 #include "app/IntakeCommand.h"
 
+#include <cerrno>
 #include <cstdio>
+#include <cstring>
 #include <fstream>
 #include <functional>
 #include <iostream>
@@ -30,20 +32,6 @@ struct Options {
   std::string logPath;
   std::optional<std::string> dumpPath;
 };
-
-// Empty, after saying why on standard error, when the arguments make no sense.
-std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> log, dump;
-  const platform::CommandLineOption table[] = {{"--dump-store", &dump, "a file name"}};
-  const platform::CommandLinePositional logArgument{&log, "metric log",
-                                                    "which metric log? (\"-\" for standard input)"};
-  if (const std::string error = platform::readCommandLine(arguments, table, logArgument);
-      !error.empty()) {
-    std::cerr << "norvo intake: " << error << '\n';
-    return std::nullopt;
-  }
-  return Options{std::string(*log), dump ? std::optional<std::string>(*dump) : std::nullopt};
-}
 
 bool writeDump(std::ofstream& file, const store::MetricValidator& intake) {
   file << platform::toJson(store::dumpStore(intake)) << '\n';
@@ -79,32 +67,33 @@ bool deliverMetricLog(std::istream& log, std::string_view logName, TarnWrapperDe
 }
 
 int runIntakeCommand(std::span<const std::string_view> arguments) {
-  if (platform::asksForHelp(arguments)) {
-    std::cout << kUsage;
-    return 0;
+  std::optional<std::string_view> logGiven, dumpGiven;
+  const platform::CommandLineOption table[] = {{"--dump-store", &dumpGiven, "a file name"}};
+  const platform::CommandLinePositional logArgument{&logGiven, "metric log",
+                                                    "which metric log? (\"-\" for standard input)"};
+  if (const auto exit = platform::openCommandLine({"norvo intake", kUsage}, arguments, table,
+                                                  logArgument, std::cout, std::cerr)) {
+    return *exit;
   }
-  const std::optional<Options> options = parseOptions(arguments);
-  if (!options) {
-    std::cerr << kUsage;
-    return 2;
-  }
+  const Options options{std::string(*logGiven),
+                        dumpGiven ? std::optional<std::string>(*dumpGiven) : std::nullopt};
 
   std::ifstream file;
-  if (options->logPath != "-") {
-    file.open(options->logPath, std::ios::binary);
+  if (options.logPath != "-") {
+    file.open(options.logPath, std::ios::binary);
     if (!file) {
-      std::cerr << "norvo intake: cannot read " << options->logPath << '\n';
+      std::cerr << "norvo intake: cannot read " << options.logPath << '\n';
       return 1;
     }
   }
-  std::istream& log = options->logPath == "-" ? std::cin : file;
-  const std::string logName = options->logPath == "-" ? "<stdin>" : options->logPath;
+  std::istream& log = options.logPath == "-" ? std::cin : file;
+  const std::string logName = options.logPath == "-" ? "<stdin>" : options.logPath;
   // Opened first, so that a long log is not read in vain.
   std::ofstream dump;
-  if (options->dumpPath) {
-    dump.open(*options->dumpPath, std::ios::binary | std::ios::trunc);
+  if (options.dumpPath) {
+    dump.open(*options.dumpPath, std::ios::binary | std::ios::trunc);
     if (!dump) {
-      std::cerr << "norvo intake: cannot write the store to " << *options->dumpPath << '\n';
+      std::cerr << "norvo intake: cannot write the store to " << *options.dumpPath << '\n';
       return 1;
     }
   }
@@ -113,13 +102,18 @@ int runIntakeCommand(std::span<const std::string_view> arguments) {
   useService(ServiceChoice{}, nullptr);
   store::MetricValidator& intake = store::MetricValidator::sharedInstance();
   const bool read = deliverMetricLog(log, logName, intake, std::cerr);
-  std::fflush(stdout);
+  // The log lines are the command's output: a disk that is full or a pipe that closed loses them.
+  if (std::fflush(stdout) != 0 || std::ferror(stdout) != 0) {
+    std::cerr << "norvo intake: cannot write the log lines to standard output: "
+              << std::strerror(errno) << '\n';
+    return 1;
+  }
   if (!read) {
     std::cerr << "norvo intake: cannot read " << logName << " to its end\n";
     return 1;
   }
-  if (options->dumpPath && !writeDump(dump, intake)) {
-    std::cerr << "norvo intake: cannot write the store to " << *options->dumpPath << '\n';
+  if (options.dumpPath && !writeDump(dump, intake)) {
+    std::cerr << "norvo intake: cannot write the store to " << *options.dumpPath << '\n';
     return 1;
   }
   return 0;

@@ -10,6 +10,7 @@
 #include "app/RootNavigationController.h"
 #include "client/TarnWrapper.h"
 #include "platform/CommandLine.h"
+#include "platform/Format.h"
 #include "platform/MainQueue.h"
 #include "platform/ParseNumber.h"
 #include "tarn/sim/SimulatorSource.h"
@@ -43,23 +44,14 @@ std::nullopt_t refuse(std::string_view why) {
   return std::nullopt;
 }
 
-// Empty, after saying why on standard error, when the arguments make no sense.
-std::optional<Options> parseOptions(std::span<const std::string_view> arguments) {
+// The arguments of the command, as given.
+struct GivenOptions {
   std::optional<std::string_view> out, to, seconds, seed, speed, service;
-  const platform::CommandLineOption table[] = {
-      {"--to", &to, "a format: pcapng, jsonl or csv"},
-      {"--seconds", &seconds},
-      {"--seed", &seed},
-      {"--speed", &speed},
-      {"--service", &service},
-  };
-  const platform::CommandLinePositional outArgument{&out, "metric log",
-                                                    "which file should the metric log go to?"};
-  if (const std::string error = platform::readCommandLine(arguments, table, outArgument);
-      !error.empty()) {
-    return refuse(error);
-  }
+};
 
+// Empty, after saying why on standard error, when the values make no sense.
+std::optional<Options> judgeOptions(const GivenOptions& given) {
+  const auto& [out, to, seconds, seed, speed, service] = given;
   Options options{.outPath = std::string(*out), .format = nullptr, .run = {}};
   if (to) {
     options.format = exporting::exportFormatNamed(*to);
@@ -80,6 +72,10 @@ std::optional<Options> parseOptions(std::span<const std::string_view> arguments)
   if (speed) {
     const auto factor = platform::parseSpeedFactor(*speed);
     if (!factor) return refuse("--speed wants a number above 0");
+    if (*factor > tarn::sim::SimulatorSource::kFastest) {
+      return refuse(platform::format("--speed of the simulator is at most %g, not %s",
+                                     tarn::sim::SimulatorSource::kFastest, *speed));
+    }
     options.run.speed = *factor;
   }
   if (service) {
@@ -172,13 +168,23 @@ bool runRecordingSession(const RecordingRun& run, const std::string& configurati
 }
 
 int runRecordCommand(std::span<const std::string_view> arguments) {
-  if (platform::asksForHelp(arguments)) {
-    std::cout << kUsage;
-    return 0;
+  GivenOptions given;
+  const platform::CommandLineOption table[] = {
+      {"--to", &given.to, "a format: pcapng, jsonl or csv"},
+      {"--seconds", &given.seconds},
+      {"--seed", &given.seed},
+      {"--speed", &given.speed},
+      {"--service", &given.service},
+  };
+  const platform::CommandLinePositional outArgument{&given.out, "metric log",
+                                                    "which file should the metric log go to?"};
+  if (const auto exit = platform::openCommandLine({"norvo record", kUsage}, arguments, table,
+                                                  outArgument, std::cout, std::cerr)) {
+    return *exit;
   }
-  const std::optional<Options> options = parseOptions(arguments);
+  const std::optional<Options> options = judgeOptions(given);
   if (!options) {
-    std::cerr << kUsage;
+    std::cerr << '\n' << kUsage;
     return 2;
   }
   const auto configuration =

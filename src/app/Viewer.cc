@@ -1,5 +1,8 @@
 #include "app/Viewer.h"
 
+#include <algorithm>
+#include <cctype>
+#include <fstream>
 #include <iostream>
 #include <memory>
 #include <optional>
@@ -17,23 +20,28 @@
 #include "app/ViewerEvents.h"
 #include "app/ViewerOutput.h"
 #include "platform/CommandLine.h"
+#include "platform/Format.h"
 #include "platform/Json.h"
+#include "platform/Log.h"
 #include "platform/ParseNumber.h"
 #include "player/Drive.h"
 #include "series/SeriesStore.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
+#include "tarn/client/Drops.h"
+#include "tarn/flow/DropTally.h"
 #include "tarn/mm/ModemManagerSource.h"
 #include "tarn/mm/SourceOption.h"
 #include "tarn/sim/SimulatorSource.h"
 #include "ui/Application.h"
+#include "ui/web/Access.h"
 #include "ui/web/ListenAddress.h"
 
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT] [--service WHERE] [--log FILE]\n"
-    "             [--replay LOG.jsonl [--speed X] [--loop]] [--alerts FILE]\n"
+    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]] [--service WHERE]\n"
+    "             [--log FILE] [--replay LOG.jsonl [--speed X] [--loop]] [--alerts FILE]\n"
     "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
     "Shows live baseband state in a web browser: LTE, UMTS and GSM radio state, serving and\n"
@@ -44,7 +52,11 @@ const std::string_view kViewerUsage =
     "options:\n"
     "  --listen ADDR:PORT  where to serve the pages (default 127.0.0.1:8080). Only loopback\n"
     "                      addresses are private; 0.0.0.0:8080 shows the pages to the whole\n"
-    "                      network. Port 0 takes any free port.\n"
+    "                      network, to those who hold its access token: Norvo makes one\n"
+    "                      at start and prints the address with it. Port 0 takes any\n"
+    "                      free port.\n"
+    "  --token-file FILE   the access token to ask for, from FILE, instead of a new one\n"
+    "  --no-auth           show the pages beyond loopback to anyone, with no token\n"
     "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
     "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
     "                      or \"dbus:ADDRESS\" on another bus;\n"
@@ -70,11 +82,12 @@ const std::string_view kViewerUsage =
     "  --help              show this text\n"
     "\n"
     "Every screen has an address made of the rows tapped to reach it, such as\n"
-    "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON and\n"
-    "/api/store answers the whole store. /dashboard graphs the levels and shows the serving\n"
-    "cell; /api/series answers the graphs' series and /api/dashboard the serving cell.\n"
-    "/timeline lists what happened: RRC changes, handovers, radio link failures,\n"
-    "registrations, carriers, bearers (/api/events).\n";
+    "/LTE/CA%20Status; /api/screens/LTE/CA%20Status answers its table as JSON,\n"
+    "/api/store answers the whole store and /api/status what was dropped under overload.\n"
+    "/dashboard graphs the levels and shows the serving cell; /api/series answers the\n"
+    "graphs' series and /api/dashboard the serving cell. /timeline lists what happened:\n"
+    "RRC changes, handovers, radio link failures, registrations, carriers, bearers\n"
+    "(/api/events).\n";
 
 namespace {
 
@@ -94,33 +107,62 @@ std::nullopt_t refuse(std::string_view why) {
   return std::nullopt;
 }
 
-// Empty, after saying why on standard error, when the arguments make no sense.
-std::optional<ViewerOptions> parseOptions(std::span<const std::string_view> arguments) {
+// The arguments of the viewer, as given.
+struct GivenOptions {
   std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile,
-      alerts;
+      alerts, tokenFile;
   bool loop = false;
-  const platform::CommandLineOption table[] = {
-      {"--listen", &listen, "an address and a port"},
-      {"--service", &service},
-      {"--replay", &replay, "a metric log"},
-      {"--speed", &speed},
-      {"--loop", &loop},
-      {"--source", &source},
-      {"--refresh", &refresh},
-      {"--log", &log, "a file name, or - for standard output"},
-      {"--mqtt-ca", &caFile, "a certificate file"},
-      {"--alerts", &alerts, "an alerts file"},
-  };
-  if (const std::string error = platform::readCommandLine(arguments, table); !error.empty()) {
-    std::cerr << "norvo: " << error << "\n\n" << kViewerUsage;
-    return std::nullopt;
-  }
+  bool noAuth = false;
+};
 
+// The access token in `path`: its first line, which may hold only what an address and a cookie
+// carry as they are.
+std::optional<std::string> readToken(std::string_view path) {
+  std::ifstream file{std::string(path)};
+  std::string token;
+  if (!file || !std::getline(file, token)) return std::nullopt;
+  while (!token.empty() && std::isspace(static_cast<unsigned char>(token.back())))
+    token.pop_back();
+  const bool plain = std::all_of(token.begin(), token.end(), [](char c) {
+    return std::isalnum(static_cast<unsigned char>(c)) || c == '-' || c == '.' || c == '_' ||
+           c == '~';
+  });
+  if (token.empty() || !plain) return std::nullopt;
+  return token;
+}
+
+// Empty, after saying why on standard error, when the values make no sense.
+std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
+  const auto& [listen, service, replay, speed, source, refresh, log, caFile, alerts, tokenFile,
+               loop, noAuth] = given;
   ViewerOptions options;
   if (listen) {
     const auto endpoint = ui::web::parseListenAddress(*listen);
     if (!endpoint) return refuse("--listen wants an address and a port, such as 127.0.0.1:8080");
     options.display.listen = *endpoint;
+  }
+  if (tokenFile && noAuth) return refuse("--token-file and --no-auth exclude each other");
+  if (tokenFile) {
+    options.display.token = readToken(*tokenFile);
+    if (!options.display.token) {
+      return refuse(platform::format(
+          "--token-file %s: the file's first line must hold the token, made of letters, digits "
+          "and - . _ ~",
+          *tokenFile));
+    }
+  } else if (!options.display.listen.address().is_loopback()) {
+    if (noAuth) {
+      platform::log::warningf(
+          "norvo: --no-auth: anyone who can reach %s sees every page and /api/store (IMSI, "
+          "ICCID, IMEI, APNs, addresses)",
+          *listen);
+    } else {
+      try {
+        options.display.token = ui::web::Access::makeToken();
+      } catch (const std::runtime_error& error) {
+        return refuse(error.what());
+      }
+    }
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);
@@ -187,14 +229,40 @@ std::string sourceName(const ViewerOptions& options) {
   return "simulated phone";
 }
 
+// How the viewer keeps up: the events its session dropped because it fell behind, by kind.
+platform::Dictionary viewerStatus() {
+  platform::Dictionary dropped;
+  std::uint64_t total = 0;
+  for (const auto& [kind, count] : tarn::client::droppedEvents()) {
+    dropped.append(tarn::flow::kindName(kind), count);
+    total += count;
+  }
+  return {{"dropped_events", total}, {"dropped_by_kind", std::move(dropped)}};
+}
+
 }  // namespace
 
 int runViewer(std::span<const std::string_view> arguments) {
-  if (platform::asksForHelp(arguments)) {
-    std::cout << kViewerUsage;
-    return 0;
+  GivenOptions given;
+  const platform::CommandLineOption table[] = {
+      {"--listen", &given.listen, "an address and a port"},
+      {"--service", &given.service},
+      {"--replay", &given.replay, "a metric log"},
+      {"--speed", &given.speed},
+      {"--loop", &given.loop},
+      {"--source", &given.source},
+      {"--refresh", &given.refresh},
+      {"--log", &given.log, "a file name, or - for standard output"},
+      {"--mqtt-ca", &given.caFile, "a certificate file"},
+      {"--alerts", &given.alerts, "an alerts file"},
+      {"--token-file", &given.tokenFile, "a file name"},
+      {"--no-auth", &given.noAuth},
+  };
+  if (const auto exit = platform::openCommandLine({"norvo", kViewerUsage}, arguments, table, {},
+                                                  std::cout, std::cerr)) {
+    return *exit;
   }
-  std::optional<ViewerOptions> options = parseOptions(arguments);
+  std::optional<ViewerOptions> options = judgeOptions(given);
   if (!options) return 2;
 
   // A replay plays on the main queue, so that it can seek; the service then has no source.
@@ -252,6 +320,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   chrome.activeAlerts = [&alerts] { return alerts.active(); };
   if (replay) chrome.replayState = [&replay] { return replay->stateDictionary(); };
   chrome.addReading(display);
+  display.readings.emplace("status", [] { return platform::toJson(viewerStatus()); });
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

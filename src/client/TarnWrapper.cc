@@ -1,7 +1,9 @@
 #include "client/TarnWrapper.h"
 
+#include <condition_variable>
 #include <fstream>
 #include <iterator>
+#include <mutex>
 #include <string>
 
 #include "platform/Log.h"
@@ -23,6 +25,12 @@ constexpr const char* kQueryName =
     "-[TarnWrapper querySpecificMetric:triggerRef:triggerType:triggerID:profileID:metricID:]";
 constexpr const char* kListenName = "-[TarnWrapper listen]";
 constexpr const char* kHandlerName = "-[TarnWrapper listen]_block_invoke";
+
+// Delegate calls posted to the main queue and not yet run. The session's queue waits while this
+// many are on their way, so that the main queue, which also answers the pages, never has more
+// than a moment's work of metrics ahead of a request; the events then wait in the session, which
+// holds their source back or keeps the latest of each kind.
+constexpr std::size_t kMostOnTheirWay = 64;
 
 // The events that listen() registers for, and where each goes.
 struct Listener {
@@ -53,17 +61,57 @@ TarnWrapper& TarnWrapper::sharedInstance() {
   return *instance;
 }
 
-TarnWrapper::TarnWrapper() : delegate_(std::make_shared<DelegateSlot>()) {
+// The hop from the session's queue to the main queue, with at most kMostOnTheirWay calls on
+// their way.
+class TarnWrapper::MainQueueHop : public std::enable_shared_from_this<MainQueueHop> {
+ public:
+  // Waits for room, then posts `call`; posts nothing once abandoned.
+  void post(std::function<void()> call) {
+    {
+      std::unique_lock lock(mutex_);
+      roomLeft_.wait(lock, [this] { return onTheirWay_ < kMostOnTheirWay || abandoned_; });
+      if (abandoned_) return;
+      ++onTheirWay_;
+    }
+    platform::postToMainQueue([hop = shared_from_this(), call = std::move(call)] {
+      hop->arrived();
+      call();
+    });
+  }
+
+  // Its wrapper has gone: a wait for room ends.
+  void abandon() {
+    const std::lock_guard lock(mutex_);
+    abandoned_ = true;
+    roomLeft_.notify_all();
+  }
+
+ private:
+  void arrived() {
+    const std::lock_guard lock(mutex_);
+    --onTheirWay_;
+    roomLeft_.notify_one();
+  }
+
+  std::mutex mutex_;
+  std::condition_variable roomLeft_;
+  std::size_t onTheirWay_ = 0;
+  bool abandoned_ = false;
+};
+
+TarnWrapper::TarnWrapper()
+    : delegate_(std::make_shared<DelegateSlot>()), hop_(std::make_shared<MainQueueHop>()) {
   tarnManager_ = tarn::client::CreateManager(std::string(kAppName), queue());
 }
 
 TarnWrapper::TarnWrapper(tarn::client::Transport& transport)
-    : delegate_(std::make_shared<DelegateSlot>()) {
+    : delegate_(std::make_shared<DelegateSlot>()), hop_(std::make_shared<MainQueueHop>()) {
   tarnManager_ = tarn::client::CreateManager(std::string(kAppName), queue(), transport);
 }
 
 TarnWrapper::~TarnWrapper() {
   delegate_->store({});
+  hop_->abandon();
 }
 
 platform::SerialQueue TarnWrapper::queue() {
@@ -118,14 +166,15 @@ void TarnWrapper::listen() {
   for (const Listener& listener : kListeners) {
     tarn::client::RegisterEventHandler(
         tarnManager_, std::string(listener.event),
-        [delegate = delegate_, listener](const Object& object, tarn::client::CompletionGroup) {
+        [delegate = delegate_, hop = hop_, listener](const Object& object,
+                                                     tarn::client::CompletionGroup) {
           platform::Value plain = tarn::ipc::toPlainDictionary(object);
           platform::log::systemf(listener.logFormat, kHandlerName, plain);
           // The delegate operations take dictionaries; anything else is only logged.
           if (delegate->load().expired() || !plain.isDictionary()) return;
           // The task holds the delegate slot rather than the wrapper, which may be gone by then.
-          platform::postToMainQueue([delegate, operation = listener.operation,
-                                     dictionary = std::move(*plain.asDictionary())] {
+          hop->post([delegate, operation = listener.operation,
+                     dictionary = std::move(*plain.asDictionary())] {
             if (const auto receiver = delegate->load().lock()) ((*receiver).*operation)(dictionary);
           });
         });

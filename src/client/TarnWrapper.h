@@ -16,7 +16,9 @@
 // commands and hands each delivered event and metric to its delegate on the main queue.
 //
 // Commands and the delegate property belong to the main queue; the session's events arrive on
-// the wrapper's serial queue.
+// the wrapper's serial queue. Every event becomes one delegate call, but the serial queue waits
+// while a few dozen calls are already on their way to the main queue: a main queue that falls
+// behind holds the session back rather than piling up work ahead of everything else it does.
 class TarnWrapper {
  public:
   // The app's name: the client name of its session and the app ID text of its commands.
@@ -54,6 +56,7 @@ class TarnWrapper {
 
  private:
   using DelegateSlot = std::atomic<std::weak_ptr<TarnWrapperDelegate>>;
+  class MainQueueHop;
 
   bool perform(const char* logName, std::string_view command, tarn::ipc::Object::Entries entries);
 
@@ -62,4 +65,5 @@ class TarnWrapper {
   // Read on the serial queue and on the main queue; shared with the event handlers and the tasks
   // they post, so that those may outlive the wrapper.
   std::shared_ptr<DelegateSlot> delegate_;
+  std::shared_ptr<MainQueueHop> hop_;
 };

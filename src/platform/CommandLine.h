@@ -1,5 +1,6 @@
 #pragma once
 
+#include <iosfwd>
 #include <optional>
 #include <span>
 #include <string>
@@ -30,8 +31,8 @@ struct CommandLinePositional {
 };
 
 // Fills in the targets of the options and of the positional, which must be unset on entry, from
-// `arguments`; a repeated option keeps its last value. Answers what is wrong with their shape in
-// one line, or an empty text.
+// `arguments`. Answers what is wrong with their shape in one line, naming the argument at fault,
+// or an empty text. An option given twice is wrong: which of the two was meant is not clear.
 [[nodiscard]] std::string readCommandLine(std::span<const std::string_view> arguments,
                                           std::span<const CommandLineOption> options,
                                           std::optional<CommandLinePositional> positional = {});
@@ -39,5 +40,21 @@ struct CommandLinePositional {
 // True when "--help" or "-h" is among the arguments: the command then shows its usage, whatever
 // else the arguments hold.
 bool asksForHelp(std::span<const std::string_view> arguments);
+
+// What a command says about itself: its name in messages ("norvo intake") and its usage text.
+struct CommandUsage {
+  std::string_view name;
+  std::string_view usage;
+};
+
+// The opening that every command shares. When the arguments ask for help, writes the usage to
+// `out` and answers 0; when their shape is wrong, writes "NAME: WHAT IS WRONG", a blank line and
+// the usage to `errors` and answers 2. Otherwise fills in the targets as readCommandLine does and
+// answers nothing: the command goes on.
+std::optional<int> openCommandLine(const CommandUsage& command,
+                                   std::span<const std::string_view> arguments,
+                                   std::span<const CommandLineOption> options,
+                                   std::optional<CommandLinePositional> positional,
+                                   std::ostream& out, std::ostream& errors);
 
 }  // namespace platform

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <sstream>
 #include <vector>
 
 namespace platform {
@@ -20,6 +21,31 @@ TEST(ACommandLine, SaysInOneLineWhatIsWrongWithItsShape) {
   EXPECT_EQ(convertFault({"in", "--out"}), "--out needs a file name");
   EXPECT_EQ(convertFault({"in", "--quiet", "other"}), "one input at a time, not also other");
   EXPECT_EQ(convertFault({"--out", "in"}), "which input?");
+  EXPECT_EQ(convertFault({"in", "--out", "a", "--out", "b"}), "--out is given twice; give it once");
+  EXPECT_EQ(convertFault({"in", "--quiet", "--quiet"}), "--quiet is given twice; give it once");
+}
+
+TEST(ACommandLine, OpensACommandWithItsUsageOnHelpOrOnAWrongShape) {
+  const CommandUsage command{"convert", "usage: convert IN\n"};
+  const struct {
+    std::vector<std::string_view> arguments;
+    std::optional<int> exit;
+    std::string_view out;
+    std::string_view errors;
+  } cases[] = {
+      {{"in"}, std::nullopt, "", ""},
+      {{"in", "--what", "-h"}, 0, "usage: convert IN\n", ""},
+      {{"in", "--what"}, 2, "", "convert: unknown option --what\n\nusage: convert IN\n"},
+  };
+  for (const auto& each : cases) {
+    std::optional<std::string_view> in;
+    std::ostringstream out, errors;
+    EXPECT_EQ(openCommandLine(command, each.arguments, {},
+                              CommandLinePositional{&in, "input", "which input?"}, out, errors),
+              each.exit);
+    EXPECT_EQ(out.str(), each.out);
+    EXPECT_EQ(errors.str(), each.errors);
+  }
 }
 
 }  // namespace

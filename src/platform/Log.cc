@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <climits>
 #include <cstdio>
 #include <mutex>
@@ -52,9 +53,24 @@ void writeToSystemLog(Channels& channels, std::string_view line) {
   syslog(LOG_NOTICE, "%.*s", length, line.data());
 }
 
+std::atomic<int> silences{0};
+
 }  // namespace
 
+Silence::Silence() {
+  ++silences;
+}
+
+Silence::~Silence() {
+  --silences;
+}
+
+bool silenced() {
+  return silences.load(std::memory_order_relaxed) > 0;
+}
+
 void plain(std::string_view line) {
+  if (silenced()) return;
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.captures.empty()) {
@@ -65,6 +81,7 @@ void plain(std::string_view line) {
 }
 
 void system(std::string_view line) {
+  if (silenced()) return;
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.captures.empty()) {
@@ -89,6 +106,21 @@ void flushPlain() {
   if (!channels.plainUnflushed) return;
   std::fflush(channels.plainOutput);
   channels.plainUnflushed = false;
+}
+
+void warning(std::string_view line) {
+  if (silenced()) return;
+  Channels& channels = Channels::instance();
+  const std::lock_guard lock(channels.mutex);
+  if (!channels.captures.empty()) {
+    channels.captures.back()->systemLines_.emplace_back(line);
+    return;
+  }
+  std::string whole(line);
+  whole += '\n';
+  // Unbuffered, so that the line is out even if the process is about to end.
+  std::fwrite(whole.data(), 1, whole.size(), stderr);
+  writeToSystemLog(channels, line);
 }
 
 Capture::Capture() {

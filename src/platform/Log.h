@@ -12,17 +12,39 @@
 // come from any thread; each is written whole, with a trailing newline.
 namespace platform::log {
 
+// While a Silence is alive, the lines of every channel are dropped, before they are even
+// formatted: for fuzzing, where millions of inputs each write lines that nobody reads.
+class Silence {
+ public:
+  Silence();
+  ~Silence();
+  Silence(const Silence&) = delete;
+  Silence& operator=(const Silence&) = delete;
+};
+
+// Whether a Silence is alive.
+bool silenced();
+
 void plain(std::string_view line);
 void system(std::string_view line);
+// Something a person must see, such as a feature that stopped or data that was lost: written to
+// standard error and to the system log, where one is running. A Capture keeps it among its
+// system lines.
+void warning(std::string_view line);
 
 template <class... Args>
 void plainf(std::string_view pattern, const Args&... arguments) {
-  plain(format(pattern, arguments...));
+  if (!silenced()) plain(format(pattern, arguments...));
 }
 
 template <class... Args>
 void systemf(std::string_view pattern, const Args&... arguments) {
-  system(format(pattern, arguments...));
+  if (!silenced()) system(format(pattern, arguments...));
+}
+
+template <class... Args>
+void warningf(std::string_view pattern, const Args&... arguments) {
+  if (!silenced()) warning(format(pattern, arguments...));
 }
 
 // Where plain lines go while no Capture is alive: standard output unless told otherwise; the
@@ -50,6 +72,7 @@ class Capture {
  private:
   friend void plain(std::string_view line);
   friend void system(std::string_view line);
+  friend void warning(std::string_view line);
 
   std::vector<std::string> plainLines_;
   std::vector<std::string> systemLines_;

@@ -144,3 +144,22 @@ TEST(TheSystemLog, StaysOffStandardOutput) {
 
 }  // namespace
 }  // namespace platform::log
+
+namespace platform::log {
+namespace {
+
+TEST(ASilence, DropsTheLinesOfEveryChannelWhileItLives) {
+  Capture capture;
+  {
+    const Silence silence;
+    plainf("dropped %d", 1);
+    systemf("dropped %d", 2);
+    warning("dropped 3");
+  }
+  plain("kept");
+  EXPECT_EQ(capture.plainLines(), std::vector<std::string>{"kept"});
+  EXPECT_TRUE(capture.systemLines().empty());
+}
+
+}  // namespace
+}  // namespace platform::log

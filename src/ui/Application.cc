@@ -17,9 +17,9 @@ namespace {
 struct Running {
   Running(const Storyboard& mainInterface, DisplayOptions& display)
       : pages(mainInterface, {}),
-        site(pages,
-             {!display.listen.address().is_loopback(), std::move(display.readings),
-              std::move(display.queries), std::move(display.documents), std::move(display.routes)}),
+        site(pages, {!display.listen.address().is_loopback(), std::move(display.readings),
+                     std::move(display.queries), std::move(display.documents),
+                     std::move(display.routes), display.token}),
         server(platform::mainQueue(),
                [this](const web::Request& request) { return site.handle(request); }, {}),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}
@@ -46,13 +46,14 @@ int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterfa
 
     running = std::make_unique<Running>(mainInterface, display);
     if (const auto error = running->server.listen(display.listen)) {
-      platform::log::plainf("Cannot listen on %s: %s", web::browserAddress(display.listen),
-                            error.message());
+      platform::log::warningf("Cannot listen on %s: %s", web::browserAddress(display.listen),
+                              error.message());
       status = 1;
       platform::stopMainQueue();
       return;
     }
-    const std::string address = web::browserAddress(running->server.localEndpoint());
+    std::string address = web::browserAddress(running->server.localEndpoint());
+    if (display.token) address += "?" + std::string(web::Access::kQueryKey) + "=" + *display.token;
     platform::log::plainf("Open %s in a browser; Ctrl-C stops.", address);
     if (display.didStartServing) display.didStartServing(address);
     running->signals.async_wait([&](const boost::system::error_code& error, int) {

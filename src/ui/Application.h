@@ -41,6 +41,9 @@ struct DisplayOptions {
   std::function<void(const std::string& address)> didStartServing;
   // Pages and APIs the app answers itself, by path (see web/Site.h).
   std::map<std::string, web::Site::Route, std::less<>> routes;
+  // When set, every page and reading needs this access token; the address printed at start
+  // carries it.
+  std::optional<std::string> token;
 };
 
 // Runs the application on the main queue until it is asked to stop: makes the window and its

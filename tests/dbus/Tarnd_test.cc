@@ -157,10 +157,12 @@ TEST(ATarnd, ReplaysALogReportingEachBrokenLineWithItsNumber) {
       {"--source", "replay:" + log, "--as-fast-as-possible", "--record", recording.string()},
       folder / "tarnd");
   ASSERT_TRUE(bus.waitForName(kBusName, true)) << tarnd->standardError();
-  // The replay waits for its first listener.
+  // The replay waits for its first subscriber: a session with its events on and a configuration.
   EXPECT_EQ(lineCount(recording), 0u);
   tarn::dbus::BusTransport transport(bus.address());
   RecordingSession listener(transport);
+  EXPECT_EQ(lineCount(recording), 0u);
+  ASSERT_EQ(listener.configure("0x3C4E04").status, tarn::status::kSuccess);
   ASSERT_TRUE(eventually([&] { return lineCount(recording) == 2; }));
   EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0);
 

@@ -4,7 +4,21 @@
 #include <unordered_map>
 #include <vector>
 
+#include "platform/Log.h"
+#include "tarn/client/Drops.h"
+#include "tarn/flow/DropTally.h"
+#include "tarn/flow/KindQueue.h"
+
 namespace tarn::client {
+
+namespace {
+
+// Events that wait for the session's queue. Past kFallingBehind the sender is told to hold back;
+// past kMostWaiting the oldest event of the most frequent kind is dropped for each new one.
+constexpr std::size_t kMostWaiting = 4096;
+constexpr std::size_t kFallingBehind = 512;
+
+}  // namespace
 
 // The session's event handlers, and the events on their way to the session's queue. Events wait
 // here and one task at a time on the queue hands them on, so a burst of events costs one hop to
@@ -19,17 +33,24 @@ class Manager::Events : public std::enable_shared_from_this<Events> {
     handlers_.insert_or_assign(std::move(event), std::move(shared));
   }
 
-  // Any thread.
-  void put(std::string_view event, ipc::Object object) {
+  // Any thread. Answers false when the session is falling behind.
+  bool put(std::string_view event, ipc::Object object) {
+    bool keepingUp = true;
     {
       const std::lock_guard lock(mutex_);
-      pending_.push_back({std::string(event), std::move(object)});
-      if (handOnQueued_) return;
+      const std::uint64_t kind = flow::kindOfEvent(event, object);
+      if (const auto dropped = pending_.push(kind, {std::string(event), std::move(object)})) {
+        drops_.count(*dropped);
+        countDroppedEvent(*dropped);
+      }
+      keepingUp = pending_.size() < kFallingBehind;
+      if (handOnQueued_) return keepingUp;
       handOnQueued_ = true;
     }
     queue_.async([weak = weak_from_this()] {
       if (const auto events = weak.lock()) events->handOn();
     });
+    return keepingUp;
   }
 
  private:
@@ -41,11 +62,14 @@ class Manager::Events : public std::enable_shared_from_this<Events> {
   // On the session's queue. Handlers run outside the lock, so that they may register handlers.
   void handOn() {
     std::vector<Pending> batch;
+    std::optional<std::string> dropReport;
     {
       const std::lock_guard lock(mutex_);
-      batch.swap(pending_);
+      batch = pending_.takeAll();
       handOnQueued_ = false;
+      dropReport = drops_.report(flow::DropTally::Clock::now());
     }
+    if (dropReport) platform::log::warning(*dropReport);
     for (const Pending& pending : batch) {
       if (const auto handler = handlerFor(pending.event)) (*handler)(pending.object, {});
     }
@@ -60,7 +84,8 @@ class Manager::Events : public std::enable_shared_from_this<Events> {
   const platform::SerialQueue queue_;
   std::mutex mutex_;
   std::unordered_map<std::string, std::shared_ptr<const EventHandler>> handlers_;
-  std::vector<Pending> pending_;
+  flow::KindQueue<Pending> pending_{kMostWaiting};
+  flow::DropTally drops_{"tarn::client"};
   bool handOnQueued_ = false;
 };
 
@@ -70,7 +95,8 @@ std::shared_ptr<Manager> Manager::open(const std::string& clientName, platform::
   manager->connection_ = transport.connect(
       clientName,
       [events = std::weak_ptr(manager->events_)](std::string_view event, ipc::Object object) {
-        if (const auto live = events.lock()) live->put(event, std::move(object));
+        const auto live = events.lock();
+        return live == nullptr || live->put(event, std::move(object));
       });
   if (!manager->connection_) return nullptr;
   return manager;

@@ -13,8 +13,10 @@
 namespace tarn::client {
 
 // Receives the events of one connection: the event's name and its object. The transport calls it
-// from its own threads, one call at a time, in the order the service sent the events.
-using EventSink = std::function<void(std::string_view event, ipc::Object object)>;
+// from its own threads, one call at a time, in the order the service sent the events. It never
+// blocks; it answers false when the session is falling behind, so that a transport that can
+// hold its sender back does.
+using EventSink = std::function<bool(std::string_view event, ipc::Object object)>;
 
 // One open session with the service. Destroying it closes the session: no sink call runs after
 // the destructor has returned.

@@ -1,7 +1,9 @@
 #include "tarn/daemon/Options.h"
 
 #include "platform/CommandLine.h"
+#include "platform/Format.h"
 #include "platform/ParseNumber.h"
+#include "tarn/sim/SimulatorSource.h"
 
 namespace tarn::daemon {
 
@@ -136,6 +138,10 @@ ParsedOptions parseDaemonOptions(std::span<const std::string_view> arguments) {
       const std::optional<std::uint64_t> seed = platform::parseNumber<std::uint64_t>(*given.seed);
       if (!seed) return refuse("--seed wants a whole number of at least 0");
       simulator.seed = *seed;
+    }
+    if (speed > sim::SimulatorSource::kFastest) {
+      return refuse(platform::format("--speed of the simulator is at most %g, not %s",
+                                     sim::SimulatorSource::kFastest, *given.speed));
     }
     simulator.speed = speed.value_or(simulator.speed);
     options.source = simulator;

@@ -120,6 +120,8 @@ TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp)
       {{"--seed", "-1"}, "--seed wants a whole number of at least 0"},
       {{"--seed", "18446744073709551616"}, "--seed wants a whole number of at least 0"},
       {{"--speed", "0"}, "--speed wants a number above 0"},
+      {{"--speed", "100000"}, "--speed of the simulator is at most 10000, not 100000"},
+      {{"--speed", "1e9"}, "--speed of the simulator is at most 10000, not 1e9"},
       {{"--speed", "fast"}, "--speed wants a number above 0"},
       {{"--loop"}, "--as-fast-as-possible and --loop go with --source replay:FILE"},
       {{"--source", "replay:a.jsonl", "--seed", "2"}, "--seed goes with --source sim"},

@@ -210,7 +210,8 @@ int serve(const DaemonOptions& options, const sigset_t& shutdownSignals) {
   std::optional<tarn::daemon::RecordFile> record;
   if (options.recordPath) {
     record.emplace(*options.recordPath);
-    source = std::make_shared<tarn::log::RecordingSource>(std::move(source), record->stream());
+    source = std::make_shared<tarn::log::RecordingSource>(std::move(source), record->stream(),
+                                                          *options.recordPath);
   }
 
   BusLoss busLoss;

@@ -101,7 +101,7 @@ void BusConnection::subscribeAndOpen() {
                                                  kSessionInterface, kEventsSignal),
                                 [this](sdbus::Message& signal) { receiveEvents(signal); });
   if (!openSession()) {
-    platform::log::systemf(
+    platform::log::warningf(
         "tarn::client: the baseband manager service %s is not on the bus (%s); the session "
         "opens when it comes",
         kBusName, whyNoSession_);
@@ -173,8 +173,8 @@ void BusConnection::sessionLost(const std::string& reason) {
   session_.reset();
   serviceOwner_.clear();
   whyNoSession_ = reason;
-  platform::log::systemf("tarn::client: lost the session with the baseband manager service (%s)",
-                         reason);
+  platform::log::warningf("tarn::client: lost the session with the baseband manager service (%s)",
+                          reason);
 }
 
 void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
@@ -187,7 +187,7 @@ void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
   if (!oldOwner.empty() && oldOwner == serviceOwner_) sessionLost("it left the bus");
   if (newOwner.empty() || session_) return;
   if (openSession()) {
-    platform::log::systemf(
+    platform::log::warningf(
         "tarn::client: the baseband manager service is back; session opened again with %zu "
         "configuration(s)",
         configurations_.size());
@@ -278,7 +278,7 @@ std::unique_ptr<client::Connection> BusTransport::connect(const std::string& cli
   try {
     return std::make_unique<BusConnection>(connectToBus(bus_), clientName, std::move(sink));
   } catch (const sdbus::Error& error) {
-    platform::log::systemf("tarn::client: cannot reach the bus %s: %s", bus_, error.getMessage());
+    platform::log::warningf("tarn::client: cannot reach the bus %s: %s", bus_, error.getMessage());
     return nullptr;
   }
 }

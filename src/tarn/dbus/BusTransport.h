@@ -18,7 +18,8 @@ class BusTransport final : public client::Transport {
   // `bus` as connectToBus takes it.
   explicit BusTransport(std::string bus);
 
-  // Empty, after a line in the system log, when the bus cannot be reached.
+  // Empty, after a warning on standard error and in the system log, when the bus cannot be
+  // reached.
   std::unique_ptr<client::Connection> connect(const std::string& clientName,
                                               client::EventSink sink) override;
 

@@ -11,9 +11,11 @@ namespace tarn::dbus {
 
 namespace {
 
-// Events waiting to be sent beyond this are dropped: a bus that stops taking them must not make
-// the service grow without bound.
+// Events waiting to be sent beyond kMaxQueuedEvents are dropped, the oldest of their kind first:
+// a bus that stops taking them must not make the service grow without bound. Past
+// kFallingBehind the source is held back.
 constexpr std::size_t kMaxQueuedEvents = 100'000;
+constexpr std::size_t kFallingBehind = 10'000;
 
 const std::string kManager(kManagerInterface);
 const std::string kSession(kSessionInterface);
@@ -38,7 +40,9 @@ struct Service::Session {
 Service::Service(std::shared_ptr<service::Core> core,
                  std::unique_ptr<sdbus::IConnection> connection,
                  std::function<void(const std::string&)> onBusLost)
-    : core_(std::move(core)), loop_(std::move(connection), std::move(onBusLost)) {
+    : core_(std::move(core)),
+      loop_(std::move(connection), std::move(onBusLost)),
+      outgoing_(kMaxQueuedEvents) {
   try {
     loop_.call([this] { publish(); });
   } catch (...) {
@@ -104,7 +108,7 @@ void Service::openSession(sdbus::MethodCall& call) {
   const service::Core::SessionId id = core_->openSession(
       clientName,
       [this, sinkSession](std::string_view event, ipc::Object record) {
-        queue(*sinkSession, event, std::move(record));
+        return queue(*sinkSession, event, std::move(record));
       },
       owner);
   *sinkSession = id;
@@ -198,32 +202,33 @@ void Service::forgetPeer(const std::string& peer) {
   }
 }
 
-void Service::queue(service::Core::SessionId session, std::string_view event, ipc::Object record) {
+bool Service::queue(service::Core::SessionId session, std::string_view event, ipc::Object record) {
+  bool keepingUp = true;
   {
     const std::lock_guard lock(outgoingMutex_);
-    if (outgoing_.size() >= kMaxQueuedEvents) {
-      ++dropped_;
-      return;
+    const std::uint64_t kind = flow::kindOfEvent(event, record);
+    if (const auto dropped =
+            outgoing_.push(kind, {session, {std::string(event), std::move(record)}})) {
+      drops_.count(*dropped);
     }
-    outgoing_.push_back({session, {std::string(event), std::move(record)}});
-    if (sendQueued_) return;
+    keepingUp = outgoing_.size() < kFallingBehind;
+    if (sendQueued_) return keepingUp;
     sendQueued_ = true;
   }
   loop_.post([this] { sendQueued(); });
+  return keepingUp;
 }
 
 void Service::sendQueued() {
   std::vector<Outgoing> batch;
-  std::size_t dropped = 0;
+  std::optional<std::string> dropReport;
   {
     const std::lock_guard lock(outgoingMutex_);
-    batch.swap(outgoing_);
+    batch = outgoing_.takeAll();
     sendQueued_ = false;
-    std::swap(dropped, dropped_);
+    dropReport = drops_.report(flow::DropTally::Clock::now());
   }
-  if (dropped > 0) {
-    platform::log::plainf("tarnd: the bus fell behind; %zu event(s) dropped", dropped);
-  }
+  if (dropReport) platform::log::warning(*dropReport);
   // One signal per session, with that session's events in their order.
   std::map<service::Core::SessionId, std::vector<Event>> bySession;
   for (Outgoing& outgoing : batch) {

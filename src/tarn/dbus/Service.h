@@ -11,6 +11,8 @@
 
 #include "tarn/dbus/Loop.h"
 #include "tarn/dbus/Marshal.h"
+#include "tarn/flow/DropTally.h"
+#include "tarn/flow/KindQueue.h"
 #include "tarn/service/Core.h"
 
 namespace tarn::dbus {
@@ -45,8 +47,8 @@ class Service {
   Session* sessionFor(service::Core::SessionId id, sdbus::MethodCall& call);
   void forgetPeer(const std::string& peer);
 
-  // Any thread: queues an event for the loop to send.
-  void queue(service::Core::SessionId session, std::string_view event, ipc::Object record);
+  // Any thread: queues an event for the loop to send. Answers false when the bus falls behind.
+  bool queue(service::Core::SessionId session, std::string_view event, ipc::Object record);
   void sendQueued();
 
   const std::shared_ptr<service::Core> core_;
@@ -56,9 +58,9 @@ class Service {
   std::map<service::Core::SessionId, std::unique_ptr<Session>> sessions_;
 
   std::mutex outgoingMutex_;
-  std::vector<Outgoing> outgoing_;
+  flow::KindQueue<Outgoing> outgoing_;
+  flow::DropTally drops_{"tarnd"};
   bool sendQueued_ = false;
-  std::size_t dropped_ = 0;
 };
 
 }  // namespace tarn::dbus

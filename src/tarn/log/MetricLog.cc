@@ -4,8 +4,11 @@
 #include <boost/json/monotonic_resource.hpp>
 #include <boost/json/parse.hpp>
 #include <boost/json/value.hpp>
+#include <cmath>
+#include <streambuf>
 
 #include "platform/Base64.h"
+#include "platform/Format.h"
 #include "platform/Json.h"
 #include "tarn/Names.h"
 
@@ -37,9 +40,11 @@ platform::Value plainValue(const boost::json::value& json) {
       return list;
     }
     case boost::json::kind::object: {
+      // The parser has kept the last of any repeated key, so every key is new.
       platform::Dictionary dictionary;
+      dictionary.reserve(json.get_object().size());
       for (const auto& member : json.get_object()) {
-        dictionary.set(std::string(member.key()), plainValue(member.value()));
+        dictionary.append(std::string(member.key()), plainValue(member.value()));
       }
       return dictionary;
     }
@@ -56,9 +61,54 @@ bool isBlank(std::string_view line) {
                      [](char c) { return c == ' ' || c == '\t' || c == '\r'; });
 }
 
+// The keys of a JSON text, counted as the colons outside its strings, up to one past `most`:
+// checked before the text is parsed, so that the parser never builds more objects than that.
+std::size_t keysUpTo(std::string_view text, std::size_t most) {
+  std::size_t keys = 0;
+  bool inString = false;
+  for (std::size_t i = 0; i < text.size() && keys <= most; ++i) {
+    const char c = text[i];
+    if (inString) {
+      if (c == '\\')
+        ++i;
+      else if (c == '"')
+        inString = false;
+    } else if (c == '"') {
+      inString = true;
+    } else if (c == ':') {
+      ++keys;
+    }
+  }
+  return keys;
+}
+
+// "t_ms": any finite number of at least 0, a fraction rounded down; not a boolean.
+std::optional<std::int64_t> deliveryTimeOf(const boost::json::value& value) {
+  // 2^63, exactly: the first whole number past the largest std::int64_t.
+  constexpr double kPastLargest = 9223372036854775808.0;
+  if (const auto* whole = value.if_int64())
+    return *whole >= 0 ? std::optional(*whole) : std::nullopt;
+  if (const auto* large = value.if_uint64()) {
+    return *large <= static_cast<std::uint64_t>(INT64_MAX)
+               ? std::optional(static_cast<std::int64_t>(*large))
+               : std::nullopt;
+  }
+  if (const auto* real = value.if_double()) {
+    if (!std::isfinite(*real) || !(*real >= 0.0) || *real >= kPastLargest) return std::nullopt;
+    return static_cast<std::int64_t>(std::floor(*real));
+  }
+  return std::nullopt;
+}
+
 }  // namespace
 
-ParsedLine parseMetricLogLine(std::string_view line) {
+ParsedLine parseMetricLogLine(std::string_view line, const MetricLogLimits& limits) {
+  if (line.size() > limits.lineBytes) {
+    return failure(platform::format("longer than %zu bytes", limits.lineBytes));
+  }
+  if (keysUpTo(line, limits.keys) > limits.keys) {
+    return failure(platform::format("more than %zu keys", limits.keys));
+  }
   // A line's values live only until the record is made: they take their memory from the
   // stack, and from the heap only for a long line.
   unsigned char scratch[4096];
@@ -77,15 +127,16 @@ ParsedLine parseMetricLogLine(std::string_view line) {
       const std::optional<platform::Bytes> payload =
           value.is_string() ? platform::base64Decode(value.get_string()) : std::nullopt;
       if (!payload) return failure("\"kKeyPayload\" is not standard base64 text");
-      entry.record.set(std::string(key), *payload);
+      entry.record.append(std::string(key), *payload);
     } else if (key == kDeliveryKey) {
-      const std::optional<std::int64_t> milliseconds = plainValue(value).asInteger();
-      if (!milliseconds || *milliseconds < 0) {
-        return failure("\"t_ms\" is not a whole number of milliseconds of at least 0");
+      entry.deliveryMs = deliveryTimeOf(value);
+      if (!entry.deliveryMs) {
+        return failure("\"t_ms\" is not a number of milliseconds of at least 0");
       }
-      entry.deliveryMs = milliseconds;
+    } else if (key == tarn::kKeyMetricID && value.is_bool()) {
+      return failure("\"kKeyMetricID\" is a boolean, not a metric ID");
     } else {
-      entry.record.set(std::string(key), plainValue(value));
+      entry.record.append(std::string(key), plainValue(value));
     }
   }
   return {std::move(entry), {}};
@@ -121,13 +172,30 @@ std::optional<std::string> formatMetricLogLine(const platform::Dictionary& recor
 
 std::optional<MetricLogReader::Line> MetricLogReader::next() {
   std::string& text = line_;
-  while (std::getline(input_, text)) {
+  while (readLine(text)) {
     ++lineNumber_;
     if (isBlank(text)) continue;
     if (text.back() == '\r') text.pop_back();
-    return Line{lineNumber_, parseMetricLogLine(text)};
+    return Line{lineNumber_, parseMetricLogLine(text, limits_)};
   }
   return std::nullopt;
+}
+
+// Like std::getline, but keeps at most one byte past the limit, so that an overlong line is
+// refused without being held whole.
+bool MetricLogReader::readLine(std::string& text) {
+  text.clear();
+  const std::istream::sentry ready(input_, true);
+  if (!ready) return false;
+  std::streambuf& buffer = *input_.rdbuf();
+  bool any = false;
+  for (int c = buffer.sbumpc(); c != std::char_traits<char>::eof(); c = buffer.sbumpc()) {
+    any = true;
+    if (c == '\n') return true;
+    if (text.size() <= limits_.lineBytes) text.push_back(static_cast<char>(c));
+  }
+  input_.setstate(any ? std::ios::eofbit : std::ios::eofbit | std::ios::failbit);
+  return any;
 }
 
 bool MetricLogWriter::write(const platform::Dictionary& record,

@@ -29,10 +29,20 @@ struct ParsedLine {
   std::string error;
 };
 
-// Refuses a line that is no JSON object, whose "kKeyPayload" is no standard base64 text, or
-// whose "t_ms" is no integer of at least 0. Nothing else is checked here: a record without an
-// integer "kKeyMetricID" is the intake's to judge.
-ParsedLine parseMetricLogLine(std::string_view line);
+// What a line may hold. A line of the log holds five keys and a payload of a few kilobytes; the
+// limits keep a broken or hostile log from taking the reader's time and memory.
+struct MetricLogLimits {
+  std::size_t lineBytes = 1024 * 1024;
+  // Keys of the line's object and of any object inside it, together.
+  std::size_t keys = 64;
+};
+
+// Refuses a line that is longer or has more keys than `limits` allow, is no JSON object, whose
+// "kKeyMetricID" is a boolean, whose "kKeyPayload" is no standard base64 text, or whose "t_ms"
+// is no finite number of at least 0 (a fraction is rounded down). Nothing else is checked here:
+// a record without an integer "kKeyMetricID" is the intake's to judge. Takes time in proportion
+// to the line's length.
+ParsedLine parseMetricLogLine(std::string_view line, const MetricLogLimits& limits = {});
 
 // The line for a record, without its newline; empty when the record has no integer
 // "kKeyMetricID" or no byte "kKeyPayload". Integer "kKeyProfileID" and "kKeyAppID" are kept,
@@ -53,15 +63,20 @@ class MetricLogReader {
     ParsedLine parsed;
   };
 
-  explicit MetricLogReader(std::istream& input) : input_(input) {}
+  explicit MetricLogReader(std::istream& input, MetricLogLimits limits = {})
+      : input_(input), limits_(limits) {}
 
-  // The next line that is not blank; empty at the end of the input or when reading failed.
+  // The next line that is not blank; empty at the end of the input or when reading failed. Of a
+  // line longer than the limit, no more than the limit is kept in memory.
   std::optional<Line> next();
   // Whether the input ended in a read error rather than at its end.
   bool failed() const { return input_.bad(); }
 
  private:
+  bool readLine(std::string& text);
+
   std::istream& input_;
+  const MetricLogLimits limits_;
   std::size_t lineNumber_ = 0;
   std::string line_;  // kept, so that its memory serves the next line
 };

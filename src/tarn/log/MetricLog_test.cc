@@ -32,6 +32,14 @@ TEST(MetricLog, LeavesJudgingTheMetricIDToTheIntake) {
   EXPECT_FALSE(text.entry->deliveryMs);
 }
 
+// An object of `count` keys: {"k0":0,"k1":0,...}.
+std::string objectWithKeys(std::size_t count) {
+  std::string text = "{";
+  for (std::size_t i = 0; i < count; ++i)
+    text += (i > 0 ? ",\"k" : "\"k") + std::to_string(i) + "\":0";
+  return text + "}";
+}
+
 TEST(MetricLog, RefusesLinesThatBreakTheFormatAndSaysWhy) {
   EXPECT_NE(parseMetricLogLine(R"({"kKeyMetricID":3952132,)").error.find("not JSON"),
             std::string::npos);
@@ -43,10 +51,60 @@ TEST(MetricLog, RefusesLinesThatBreakTheFormatAndSaysWhy) {
     EXPECT_FALSE(parsed.entry) << line;
     EXPECT_EQ(parsed.error, "\"kKeyPayload\" is not standard base64 text") << line;
   }
-  for (const char* line : {R"({"kKeyMetricID":1,"t_ms":-1})", R"({"kKeyMetricID":1,"t_ms":"soon"})",
-                           R"({"kKeyMetricID":1,"t_ms":2.5})"}) {
-    EXPECT_FALSE(parseMetricLogLine(line).entry) << line;
+  const struct {
+    std::string line;
+    std::string error;
+  } refused[] = {
+      {R"({"kKeyMetricID":1,"t_ms":-1})", "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":1,"t_ms":-0.5})",
+       "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":1,"t_ms":"soon"})",
+       "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":1,"t_ms":true})",
+       "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":1,"t_ms":1e999})",
+       "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":1,"t_ms":1e19})",
+       "\"t_ms\" is not a number of milliseconds of at least 0"},
+      {R"({"kKeyMetricID":true,"kKeyPayload":""})",
+       "\"kKeyMetricID\" is a boolean, not a metric ID"},
+      {objectWithKeys(64), ""},
+      {objectWithKeys(65), "more than 64 keys"},
+      {R"({"k":{"a":":","b":"\":"}})", ""},
+      {R"({"a":{"b":1,"c":[{"d":2}]}})" + std::string(1024 * 1024, ' '),
+       "longer than 1048576 bytes"},
+  };
+  for (const auto& [line, error] : refused) {
+    const ParsedLine parsed = parseMetricLogLine(line);
+    if (error.empty()) {
+      EXPECT_TRUE(parsed.entry) << line;
+    } else {
+      EXPECT_FALSE(parsed.entry) << line.substr(0, 80);
+      EXPECT_EQ(parsed.error, error) << line.substr(0, 80);
+    }
   }
+}
+
+TEST(MetricLog, RoundsAFractionalDeliveryTimeDown) {
+  for (const auto& [text, ms] : {std::pair{"12.5", 12}, {"0.999", 0}, {"3e2", 300}, {"7", 7}}) {
+    const ParsedLine parsed =
+        parseMetricLogLine(std::string(R"({"kKeyMetricID":1,"t_ms":)") + text + "}");
+    ASSERT_TRUE(parsed.entry) << text;
+    EXPECT_EQ(parsed.entry->deliveryMs, ms) << text;
+  }
+}
+
+TEST(MetricLog, RefusesAnOverlongLineWithoutHoldingItAndReadsOn) {
+  std::istringstream log(std::string(100, 'x') + "\n{\"kKeyMetricID\":2}\n");
+  MetricLogReader reader(log, {.lineBytes = 20, .keys = 4});
+  const auto overlong = reader.next();
+  ASSERT_TRUE(overlong);
+  EXPECT_EQ(overlong->parsed.error, "longer than 20 bytes");
+  const auto next = reader.next();
+  ASSERT_TRUE(next && next->parsed.entry);
+  EXPECT_EQ(next->number, 2u);
+  EXPECT_FALSE(reader.next());
+  EXPECT_FALSE(reader.failed());
 }
 
 TEST(MetricLog, WritesWhatItReadsBack) {

@@ -1,10 +1,12 @@
 #pragma once
 
+#include <atomic>
 #include <chrono>
 #include <functional>
 #include <memory>
 #include <optional>
 #include <ostream>
+#include <string>
 
 #include "tarn/log/MetricLog.h"
 #include "tarn/service/MetricSource.h"
@@ -20,21 +22,27 @@ class RecordingSource final : public service::MetricSource {
   using Clock = std::chrono::steady_clock;
 
   // `log` must outlive the source. Each line is flushed as it is written, so that the log holds
-  // everything delivered so far should the process end abruptly.
+  // everything delivered so far should the process end abruptly. When a line cannot be written
+  // (a full disk, say), recording stops at once with a warning that names `logName`; the metrics
+  // are still handed on. writeFailed() tells afterwards.
   RecordingSource(std::shared_ptr<service::MetricSource> source, std::ostream& log,
-                  Clock::time_point began = Clock::now());
+                  std::string logName = "the metric log", Clock::time_point began = Clock::now());
 
   void start(std::function<void(service::Metric)> deliver) override;
   void stop() override;
   std::optional<service::Metric> query(std::uint32_t metricId) override;
   bool startsWithFirstListener() const override { return source_->startsWithFirstListener(); }
 
+  bool writeFailed() const { return writeFailed_; }
+
  private:
   // Called on the wrapped source's delivery thread only.
   void record(const service::Metric& metric);
 
   const std::shared_ptr<service::MetricSource> source_;
+  const std::string logName_;
   const Clock::time_point began_;
+  std::atomic<bool> writeFailed_ = false;
   std::ostream& log_;
   MetricLogWriter writer_;
 };

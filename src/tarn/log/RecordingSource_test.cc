@@ -13,6 +13,7 @@
 #include <utility>
 #include <vector>
 
+#include "platform/Log.h"
 #include "tarn/replay/ReplaySource.h"
 #include "tarn/testing/ScriptedMetricSource.h"
 
@@ -55,7 +56,7 @@ class RecordingSourceTest : public ::testing::Test {
   // handed on to the service.
   std::vector<Metric> recordThrough(const std::vector<Metric>& metrics,
                                     std::chrono::milliseconds ago = 0ms) {
-    RecordingSource recorder(scripted_, log_, RecordingSource::Clock::now() - ago);
+    RecordingSource recorder(scripted_, log_, "the log", RecordingSource::Clock::now() - ago);
     std::vector<Metric> handedOn;
     recorder.start([&handedOn](Metric metric) { handedOn.push_back(std::move(metric)); });
     for (const Metric& metric : metrics)
@@ -117,6 +118,25 @@ TEST_F(RecordingSourceTest, ReplayingTheRecordingDeliversTheSameMetricsInTheSame
   ASSERT_EQ(done.get_future().wait_for(5s), std::future_status::ready);
   replay.stop();
   EXPECT_EQ(plain(replayed), plain(kMetrics));
+}
+
+TEST(ARecordingSource, StopsRecordingAtOnceWithAWarningWhenTheLogCannotBeWritten) {
+  platform::log::Capture log;
+  const auto scripted = std::make_shared<testing::ScriptedMetricSource>();
+  std::ofstream full("/dev/full");
+  RecordingSource recorder(scripted, full, "/dev/full");
+  std::vector<Metric> handedOn;
+  recorder.start([&handedOn](Metric metric) { handedOn.push_back(std::move(metric)); });
+  for (const Metric& metric : kMetrics)
+    scripted->emit(metric);
+  scripted->flush();
+  recorder.stop();
+
+  EXPECT_TRUE(recorder.writeFailed());
+  EXPECT_EQ(plain(handedOn), plain(kMetrics));
+  EXPECT_EQ(log.systemLines(),
+            std::vector<std::string>{"cannot write /dev/full (No space left on device); recording "
+                                     "stopped"});
 }
 
 }  // namespace

@@ -77,6 +77,10 @@ std::int64_t parseProfileId(const std::vector<std::string_view>& words, std::siz
 
 Configuration Configuration::parse(std::string_view text) {
   if (text.empty()) throw ConfigurationError("the configuration is empty");
+  if (text.size() > kLargestText) {
+    throw ConfigurationError(platform::format(
+        "the configuration is %zu bytes long; it may be at most %zu", text.size(), kLargestText));
+  }
   if (text.starts_with(kByteOrderMark)) text.remove_prefix(kByteOrderMark.size());
 
   Configuration configuration;
@@ -86,7 +90,8 @@ Configuration Configuration::parse(std::string_view text) {
   while (!text.empty()) {
     ++line;
     const std::size_t end = std::min(text.find('\n'), text.size());
-    const std::string_view content = text.substr(0, std::min(text.find('#'), end));
+    const std::string_view whole = text.substr(0, end);
+    const std::string_view content = whole.substr(0, whole.find('#'));
     text.remove_prefix(std::min(end + 1, text.size()));
 
     const std::vector<std::string_view> words = wordsOf(content);

@@ -57,6 +57,11 @@ TEST(AConfiguration, NamesTheLineAndTheFaultOfAMalformedText) {
   };
   for (const auto& [text, error] : cases)
     EXPECT_EQ(errorOf(text), error) << text;
+
+  const std::string largest(Configuration::kLargestText, '#');
+  EXPECT_EQ(errorOf(largest), "the configuration subscribes to no metric");
+  EXPECT_EQ(errorOf(largest + "\n0x1"),
+            "the configuration is 1048580 bytes long; it may be at most 1048576");
 }
 
 TEST(TheShippedConfiguration, SubscribesToEveryMetricThatTheIntakeKnows) {

@@ -1,6 +1,8 @@
 #include "tarn/service/Core.h"
 
 #include <algorithm>
+#include <chrono>
+#include <thread>
 
 #include "platform/Format.h"
 #include "tarn/Names.h"
@@ -17,6 +19,10 @@ constexpr std::int64_t kConfigurationText = 0;
 constexpr std::int64_t kOnDemandTriggers = 0x7F0000;
 constexpr std::uint32_t kMetrics = 0x3C0000;
 constexpr std::int64_t kTagMask = 0xFFFF;
+
+// How long a delivery waits when a receiver falls behind. Receivers take hundreds of metrics in
+// this time, so a source held back this much per metric never outruns them for long.
+constexpr auto kHoldBack = std::chrono::milliseconds(1);
 
 std::uint32_t metricIdOf(std::int64_t value) {
   if (value <= 0 || value > 0xFFFFFFFF) {
@@ -90,13 +96,23 @@ void Core::closeSession(SessionId session) {
 }
 
 void Core::setEventsOn(SessionId session, bool on) {
+  bool subscribed = false;
   {
     const std::lock_guard lock(mutex_);
     const auto found = sessions_.find(session);
     if (found == sessions_.end()) return;
     found->second.eventsOn = on;
+    subscribed = hasSubscriber();
   }
-  if (on) startSource();
+  if (subscribed) startSource();
+}
+
+bool Core::hasSubscriber() const {
+  return std::any_of(sessions_.begin(), sessions_.end(), [this](const auto& open) {
+    const Session& session = open.second;
+    return session.eventsOn && session.appId &&
+           configurations_.contains({session.peer, *session.appId});
+  });
 }
 
 // Outside the lock: delivery takes it.
@@ -154,8 +170,13 @@ void Core::addConfiguration(const std::string& peer, const Arguments& arguments)
   try {
     Configuration configuration = Configuration::parse(
         std::string_view(reinterpret_cast<const char*>(payload.data()), payload.size()));
-    const std::lock_guard lock(mutex_);
-    configurations_.insert_or_assign({peer, appId}, std::move(configuration));
+    bool subscribed = false;
+    {
+      const std::lock_guard lock(mutex_);
+      configurations_.insert_or_assign({peer, appId}, std::move(configuration));
+      subscribed = hasSubscriber();
+    }
+    if (subscribed) startSource();
   } catch (const ConfigurationError& error) {
     throw Refusal{status::kMalformedConfiguration,
                   platform::format("malformed configuration: %s", error.what())};
@@ -190,29 +211,37 @@ void Core::queryMetric(const std::string& peer, const Arguments& arguments) {
       {std::string(kKeyProfileID), ipc::Object::integer(profileId)},
   });
   const ConfigurationKey app{peer, appId};
+  // A query is answered whether or not its receiver keeps up: it is one metric, asked for.
   const std::lock_guard lock(mutex_);
   sendToApp(app, kEventTrigger, std::move(trigger));
   sendToApp(app, kEventMetric, metricRecord(*answer, profileId, appId));
 }
 
 void Core::deliver(const Metric& metric) {
-  const std::lock_guard lock(mutex_);
-  for (const auto& [app, configuration] : configurations_) {
-    if (const std::optional<std::int64_t> profileId = configuration.profileOf(metric.metricId)) {
-      sendToApp(app, kEventMetric, metricRecord(metric, *profileId, app.second));
+  bool keptUp = true;
+  {
+    const std::lock_guard lock(mutex_);
+    for (const auto& [app, configuration] : configurations_) {
+      if (const std::optional<std::int64_t> profileId = configuration.profileOf(metric.metricId)) {
+        keptUp &= sendToApp(app, kEventMetric, metricRecord(metric, *profileId, app.second));
+      }
     }
   }
+  // On the source's thread and outside the lock, so that commands go on meanwhile.
+  if (!keptUp) std::this_thread::sleep_for(kHoldBack);
 }
 
-void Core::sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record) {
+bool Core::sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record) {
   // Each receiver but the last gets a copy.
+  bool keptUp = true;
   const EventSink* previous = nullptr;
   for (const auto& [id, session] : sessions_) {
     if (!session.eventsOn || session.peer != app.first || session.appId != app.second) continue;
-    if (previous != nullptr) (*previous)(event, record);
+    if (previous != nullptr) keptUp &= (*previous)(event, record);
     previous = &session.sink;
   }
-  if (previous != nullptr) (*previous)(event, std::move(record));
+  if (previous != nullptr) keptUp &= (*previous)(event, std::move(record));
+  return keptUp;
 }
 
 }  // namespace tarn::service

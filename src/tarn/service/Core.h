@@ -32,11 +32,14 @@ class Arguments;
 class Core {
  public:
   using SessionId = std::uint64_t;
-  // Receives one session's events: the event's name and its record.
-  using EventSink = std::function<void(std::string_view event, ipc::Object record)>;
+  // Receives one session's events: the event's name and its record. Answers false when the
+  // receiver is falling behind: the source's deliveries are then held back a little each, so
+  // that a source faster than its slowest receiver goes at that receiver's pace.
+  using EventSink = std::function<bool(std::string_view event, ipc::Object record)>;
 
   // Serves `source` (none: a baseband that reports nothing), starting it at once or, if it asks
-  // to, when the first session switches its events on. Stops it on destruction.
+  // to, when a session first subscribes to metrics: its events are on and its peer has pushed a
+  // configuration for its app. Stops it on destruction.
   explicit Core(std::shared_ptr<MetricSource> source = nullptr,
                 std::vector<App> apps = registeredApps());
   ~Core();
@@ -72,10 +75,13 @@ class Core {
   void queryMetric(const std::string& peer, const Arguments& arguments);
 
   void startSource();
+  // Whether some session receives metrics: its events are on and its peer has configured its
+  // app. Needs mutex_ held.
+  bool hasSubscriber() const;
   std::int64_t knownAppId(const Arguments& arguments) const;
   void deliver(const Metric& metric);
-  // Needs mutex_ held.
-  void sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record);
+  // Needs mutex_ held. Answers false when a receiver is falling behind.
+  bool sendToApp(const ConfigurationKey& app, std::string_view event, ipc::Object record);
 
   const std::vector<App> apps_;
   const std::shared_ptr<MetricSource> source_;

@@ -215,6 +215,38 @@ TEST_F(AService, RefusesEveryFaultyCommandWithAStatusAndAMessageThatNamesTheFaul
     EXPECT_EQ(perform(faulty.command, faulty.input), faulty.result);
 }
 
+TEST(ARecordedDrive, StartsOnceASessionHasItsEventsOnAndItsAppConfiguredInEitherOrder) {
+  for (const bool configureFirst : {false, true}) {
+    const auto drive = std::make_shared<tarn::testing::ScriptedMetricSource>(true);
+    const auto core = std::make_shared<service::Core>(drive);
+    transport::InProcess inProcess(core);
+    const platform::SerialQueue queue("org.norvo.test.sessions");
+    const auto app = client::CreateManager("vexmora", queue, inProcess);
+    const auto stranger = client::CreateManager("someone-else", queue, inProcess);
+    Object output;
+    const Object configuration = withAppId({entry(kKeyPayload, bytesOf("0x3C4E04"))});
+
+    client::EventsOn(stranger);
+    client::EventsOn(app);
+    client::EventsOff(app);
+    EXPECT_FALSE(drive->started());
+    if (configureFirst) {
+      ASSERT_EQ(
+          client::PerformCommand(app, std::string(kCommandAddConfiguration), configuration, output),
+          CommandResult{});
+      EXPECT_FALSE(drive->started()) << "the app's events are off";
+      client::EventsOn(app);
+    } else {
+      client::EventsOn(app);
+      EXPECT_FALSE(drive->started()) << "the app has not said which metrics it wants";
+      ASSERT_EQ(
+          client::PerformCommand(app, std::string(kCommandAddConfiguration), configuration, output),
+          CommandResult{});
+    }
+    EXPECT_TRUE(drive->started());
+  }
+}
+
 TEST(AClientSession, AnswersWithAStatusWhenItsHandleIsEmptyOrItsServiceHasGone) {
   platform::log::Capture log;
   Object output;

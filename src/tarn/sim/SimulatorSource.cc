@@ -1,11 +1,13 @@
 #include "tarn/sim/SimulatorSource.h"
 
+#include <algorithm>
 #include <chrono>
 #include <cmath>
 #include <stdexcept>
 #include <vector>
 
 #include "messages/Metrics.h"
+#include "platform/Format.h"
 
 namespace tarn::sim {
 namespace {
@@ -14,6 +16,9 @@ using Clock = std::chrono::steady_clock;
 
 // How often the worker wakes to deliver what has come due, in wall-clock time.
 constexpr auto kTick = std::chrono::milliseconds(20);
+// The most simulated time one step computes while it holds the lock: a few dozen metrics, so
+// that query() and stop() never wait long, whatever the speed.
+constexpr double kSliceMs = 10'000.0;
 
 std::uint64_t systemNowMs() {
   return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::milliseconds>(
@@ -22,7 +27,10 @@ std::uint64_t systemNowMs() {
 }
 
 double checkedSpeed(double speed) {
-  if (!(speed > 0.0)) throw std::invalid_argument("the simulator's speed must be above 0");
+  if (!(speed > 0.0 && speed <= SimulatorSource::kFastest)) {
+    throw std::invalid_argument(platform::format(
+        "the simulator's speed must be above 0 and at most %g", SimulatorSource::kFastest));
+  }
   return speed;
 }
 
@@ -63,15 +71,21 @@ void SimulatorSource::run(std::stop_token stop,
   const Clock::time_point began = Clock::now();
   double simulatedMs = 0.0;  // simulated time advanced since `began`
   std::unique_lock lock(mutex_);
-  while (!wake_.wait_for(lock, stop, kTick, [&stop] { return stop.stop_requested(); })) {
+  bool behind = false;  // more is due than the last slice covered: go on without waiting
+  while (!(behind ? stop.stop_requested()
+                  : wake_.wait_for(lock, stop, kTick, [&stop] { return stop.stop_requested(); }))) {
     const double wallMs = std::chrono::duration<double, std::milli>(Clock::now() - began).count();
     const double dueMs = std::floor(wallMs * speed_ - simulatedMs);
+    behind = dueMs > kSliceMs;
     if (dueMs < 1.0) continue;
-    simulatedMs += dueMs;
-    std::vector<TimedMetric> metrics = simulator_.advance(static_cast<std::uint64_t>(dueMs));
+    const double sliceMs = std::min(dueMs, kSliceMs);
+    simulatedMs += sliceMs;
+    std::vector<TimedMetric> metrics = simulator_.advance(static_cast<std::uint64_t>(sliceMs));
     lock.unlock();
-    for (TimedMetric& timed : metrics)
+    for (TimedMetric& timed : metrics) {
+      if (stop.stop_requested()) break;
       deliver(std::move(timed.metric));
+    }
     lock.lock();
   }
 }

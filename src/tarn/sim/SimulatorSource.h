@@ -17,8 +17,14 @@ namespace tarn::sim {
 // drive twice as fast), and delivers each metric when its simulated time comes.
 class SimulatorSource final : public service::MetricSource {
  public:
-  // `speed` must be above 0 (std::invalid_argument otherwise). Simulated time starts at
-  // `startEpochMs`, or at the system clock's time of construction.
+  // The fastest speed: a simulated day in under 10 s. Faster would only outrun every receiver,
+  // which hold the source back anyway.
+  static constexpr double kFastest = 10'000.0;
+
+  // `speed` must be above 0 and at most kFastest (std::invalid_argument otherwise). Simulated
+  // time starts at `startEpochMs`, or at the system clock's time of construction. The drive
+  // advances in slices of simulated time, the lock released between them, so that query() and
+  // stop() answer at once at any speed; a receiver that falls behind holds it back.
   explicit SimulatorSource(std::uint64_t seed, double speed = 1.0,
                            std::optional<std::uint64_t> startEpochMs = std::nullopt);
   ~SimulatorSource() override;

@@ -13,9 +13,21 @@ namespace tarn::testing {
 // own, and answers queries from the metrics a test leaves for them.
 class ScriptedMetricSource final : public service::MetricSource {
  public:
+  // A source that `waitsForFirstListener` plays a recorded drive.
+  explicit ScriptedMetricSource(bool waitsForFirstListener = false)
+      : waitsForFirstListener_(waitsForFirstListener) {}
+
   void start(std::function<void(service::Metric)> deliver) override {
     const std::lock_guard lock(mutex_);
     deliver_ = std::move(deliver);
+    started_ = true;
+  }
+
+  bool startsWithFirstListener() const override { return waitsForFirstListener_; }
+
+  bool started() {
+    const std::lock_guard lock(mutex_);
+    return started_;
   }
 
   // Deliveries hold the lock, so none runs once this has taken it.
@@ -51,8 +63,10 @@ class ScriptedMetricSource final : public service::MetricSource {
   }
 
  private:
+  const bool waitsForFirstListener_;
   std::mutex mutex_;
   std::function<void(service::Metric)> deliver_;
+  bool started_ = false;
   std::map<std::uint32_t, service::Metric> answers_;
   platform::SerialQueue thread_{"org.norvo.test.source"};
 };

@@ -9,6 +9,7 @@
 #include <boost/beast/http/read.hpp>
 #include <boost/beast/http/write.hpp>
 #include <exception>
+#include <map>
 #include <optional>
 #include <set>
 #include <utility>
@@ -24,18 +25,30 @@ struct Server::Shared {
   Handler handler;
   Limits limits;
   std::set<std::weak_ptr<Connection>, std::owner_less<>> connections;
+  std::map<boost::asio::ip::address, std::size_t> byClient;
   bool stopped = false;
+
+  // Whether a new connection from `client` may have a slot.
+  bool admits(const boost::asio::ip::address& client) const {
+    const auto found = byClient.find(client);
+    if (found != byClient.end() && found->second >= limits.maxPerClient) return false;
+    const std::size_t slots = client.is_loopback() || limits.keptForLoopback > limits.maxConnections
+                                  ? limits.maxConnections
+                                  : limits.maxConnections - limits.keptForLoopback;
+    return connections.size() < slots;
+  }
 };
 
 // One client connection: requests are read and answered one after another until the client
 // closes, asks to close, goes quiet for longer than the read timeout or sends something broken.
 class Server::Connection : public std::enable_shared_from_this<Connection> {
  public:
-  Connection(tcp::socket socket, std::shared_ptr<Shared> shared)
-      : stream_(std::move(socket)), shared_(std::move(shared)) {}
+  Connection(tcp::socket socket, boost::asio::ip::address client, std::shared_ptr<Shared> shared)
+      : stream_(std::move(socket)), client_(std::move(client)), shared_(std::move(shared)) {}
 
   void start() {
     shared_->connections.insert(weak_from_this());
+    ++shared_->byClient[client_];
     read();
   }
 
@@ -45,7 +58,10 @@ class Server::Connection : public std::enable_shared_from_this<Connection> {
     stream_.close();
   }
 
-  ~Connection() { shared_->connections.erase(weak_from_this()); }
+  ~Connection() {
+    shared_->connections.erase(weak_from_this());
+    if (--shared_->byClient[client_] == 0) shared_->byClient.erase(client_);
+  }
 
  private:
   void read() {
@@ -103,6 +119,7 @@ class Server::Connection : public std::enable_shared_from_this<Connection> {
   }
 
   beast::tcp_stream stream_;
+  const boost::asio::ip::address client_;
   beast::flat_buffer buffer_;
   std::optional<beast::http::request_parser<beast::http::string_body>> parser_;
   std::optional<Response> response_;
@@ -111,7 +128,7 @@ class Server::Connection : public std::enable_shared_from_this<Connection> {
 
 Server::Server(boost::asio::io_context& context, Handler handler, Limits limits)
     : acceptor_(context),
-      shared_(std::make_shared<Shared>(Shared{std::move(handler), limits, {}, false})) {}
+      shared_(std::make_shared<Shared>(Shared{std::move(handler), limits, {}, {}, false})) {}
 
 Server::~Server() {
   stop();
@@ -157,11 +174,13 @@ void Server::accept() {
         // The server may be gone by now; `shared` tells.
         if (shared->stopped) return;
         if (!error) {
-          if (shared->connections.size() >= shared->limits.maxConnections) {
+          boost::system::error_code unknown;
+          const boost::asio::ip::address client = socket.remote_endpoint(unknown).address();
+          if (unknown || !shared->admits(client)) {
             boost::system::error_code ignored;
             socket.close(ignored);
           } else {
-            std::make_shared<Connection>(std::move(socket), shared)->start();
+            std::make_shared<Connection>(std::move(socket), client, shared)->start();
           }
         }
         accept();

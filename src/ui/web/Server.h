@@ -17,12 +17,20 @@ class Server {
  public:
   using Handler = std::function<Response(const Request&)>;
 
+  // Slow or greedy clients cannot lock others out: a client (one address) holds a few
+  // connections at most, a request must arrive whole soon after it starts or the connection
+  // idles, and the last slots are kept for clients on this machine.
   struct Limits {
     std::size_t headerBytes = 8 * 1024;
     std::size_t bodyBytes = 1024;  // pages are only read, so requests carry next to nothing
-    std::chrono::steady_clock::duration readTimeout = std::chrono::seconds(15);
+    // From the moment the server waits for a request, whether idle after an answer or receiving
+    // one byte at a time, to the request's last byte.
+    std::chrono::steady_clock::duration readTimeout = std::chrono::seconds(5);
     std::chrono::steady_clock::duration writeTimeout = std::chrono::seconds(15);
     std::size_t maxConnections = 256;  // connections past this are closed at once
+    std::size_t maxPerClient = 16;     // from one address
+    // Of maxConnections, this many only loopback clients may take.
+    std::size_t keptForLoopback = 32;
   };
 
   Server(boost::asio::io_context& context, Handler handler, Limits limits);

@@ -134,6 +134,39 @@ TEST_F(AServer, ClosesConnectionsPastItsLimitAtOnce) {
   EXPECT_NE(exchange(first, "GET / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"), "");
 }
 
+TEST_F(AServer, LetsNoClientHoldMoreThanItsShareOfTheConnections) {
+  // 127.0.0.2 stands for another client.
+  start({.maxConnections = 4, .maxPerClient = 2, .keptForLoopback = 1});
+  const auto from = [this](const char* address) {
+    tcp::socket socket(client);
+    socket.open(tcp::v4());
+    socket.bind({asio::ip::make_address(address), 0});
+    socket.connect(endpoint);
+    return socket;
+  };
+  tcp::socket first = from("127.0.0.1");
+  tcp::socket second = from("127.0.0.1");
+  waitForConnections(2);
+  tcp::socket third = from("127.0.0.1");
+  EXPECT_EQ(exchange(third, "GET / HTTP/1.1\r\nHost: x\r\n\r\n"), "") << "past its share";
+  tcp::socket other = from("127.0.0.2");
+  EXPECT_NE(exchange(other, "GET / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"), "");
+  EXPECT_NE(exchange(first, "GET / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"), "");
+}
+
+TEST_F(AServer, ClosesAConnectionWhoseRequestTricklesInPastTheReadTimeout) {
+  start({.readTimeout = 200ms});
+  tcp::socket socket = connect();
+  std::string answer;
+  boost::system::error_code error;
+  // One byte, then silence: the request never completes.
+  asio::write(socket, asio::buffer(std::string_view("G")));
+  asio::read(socket, asio::dynamic_buffer(answer), error);
+  EXPECT_TRUE(answer.empty());
+  EXPECT_EQ(error, asio::error::eof);
+  EXPECT_EQ(handled, 0);
+}
+
 TEST_F(AServer, ClosesItsOpenConnectionsWhenStopped) {
   start();
   tcp::socket socket = connect();

@@ -33,7 +33,9 @@ Response error(const Request& request, http::status status, ErrorFormat format) 
 
 }  // namespace
 
-Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {}
+Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {
+  if (options_.token) access_.emplace(*options_.token);
+}
 
 Response Site::handle(const Request& request) {
   const std::string_view target = request.target();
@@ -55,6 +57,9 @@ Response Site::handle(const Request& request) {
 Response Site::route(const Request& request, std::string_view path) {
   if (!hostAllowed(request))
     return error(request, http::status::misdirected_request, formatFor(path));
+  if (access_) {
+    if (std::optional<Response> refusal = access_->check(request)) return std::move(*refusal);
+  }
   if (request.target().size() > kMaxTarget)
     return error(request, http::status::uri_too_long, formatFor(path));
   if (const auto own = options_.routes.find(path); own != options_.routes.end())

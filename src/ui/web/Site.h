@@ -2,10 +2,12 @@
 
 #include <functional>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "ui/web/Access.h"
 #include "ui/web/Address.h"
 #include "ui/web/Http.h"
 #include "ui/web/OpenPages.h"
@@ -57,6 +59,8 @@ class Site {
     std::vector<Document> documents;
     // By path: "/api/replay" answers every request for /api/replay. Routes come first.
     std::map<std::string, Route, std::less<>> routes;
+    // When set, every answer needs this access token (see Access.h).
+    std::optional<std::string> token = std::nullopt;
   };
 
   Site(OpenPages& pages, Options options);
@@ -75,6 +79,7 @@ class Site {
 
   OpenPages& pages_;
   Options options_;
+  std::optional<Access> access_;
 };
 
 }  // namespace ui::web

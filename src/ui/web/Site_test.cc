@@ -287,3 +287,52 @@ TEST(OpenPages, CloseTheLeastRecentlyAskedForPageWhenFull) {
 
 }  // namespace
 }  // namespace ui::web
+
+namespace ui::web {
+namespace {
+
+// Pages shown beyond loopback, to holders of the token "s3cret" only.
+class AGuardedSite : public ASite {
+ protected:
+  Response ask(std::string target, std::optional<std::string> cookie = std::nullopt) {
+    Request request(http::verb::get, target, 11);
+    if (cookie) request.set(http::field::cookie, *cookie);
+    return guarded.handle(request);
+  }
+
+  Site guarded{pages, {true, {{"store", [] { return std::string(R"({"a":1})"); }}}, "s3cret"}};
+};
+
+TEST_F(AGuardedSite, AsksForItsTokenSetsItAsACookieOnceGivenAndTakesTheCookieFromThenOn) {
+  for (const char* target : {"/", "/api/store", "/Beta", "/assets/norvo.css", "/?token=wrong",
+                             "/?token=", "/?tokens3cret", "/?x=token=s3cret"}) {
+    const Response refused = ask(target);
+    EXPECT_EQ(refused.result(), http::status::unauthorized) << target;
+    EXPECT_NE(refused.body().find("access token"), std::string::npos) << target;
+  }
+  for (const char* cookie : {"norvo_token=wrong", "other=s3cret", "norvo_token=s3cret2"}) {
+    EXPECT_EQ(ask("/api/store", cookie).result(), http::status::unauthorized) << cookie;
+  }
+
+  const Response welcome = ask("/Beta?a=1&token=s3cret&b=2");
+  EXPECT_EQ(welcome.result(), http::status::see_other);
+  EXPECT_EQ(welcome[http::field::location], "/Beta?a=1&b=2");
+  EXPECT_EQ(welcome[http::field::set_cookie],
+            "norvo_token=s3cret; HttpOnly; SameSite=Strict; Path=/");
+  EXPECT_EQ(ask("/?token=s3cret")[http::field::location], "/");
+
+  const Response store = ask("/api/store", "theme=dark; norvo_token=s3cret");
+  EXPECT_EQ(store.result(), http::status::ok);
+  EXPECT_EQ(store.body(), R"({"a":1})");
+  EXPECT_EQ(ask("/Beta", "norvo_token=s3cret").result(), http::status::ok);
+}
+
+TEST(AnAccessToken, IsNewEachTimeAndSafeInAnAddressAndACookie) {
+  const std::string first = Access::makeToken();
+  EXPECT_EQ(first.size(), 64u);
+  EXPECT_EQ(first.find_first_not_of("0123456789abcdef"), std::string::npos);
+  EXPECT_NE(Access::makeToken(), first);
+}
+
+}  // namespace
+}  // namespace ui::web

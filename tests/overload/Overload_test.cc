@@ -1,0 +1,209 @@
+// Norvo and tarnd as a user runs them, offered more than they can take: a drive replayed without
+// pauses, looping, and the simulator at its fastest. The assertions are on what must hold however
+// loaded the machine is: nothing lost where the source can be held back, memory within bounds,
+// every page answered, and a prompt end on SIGINT or SIGTERM.
+#include <arpa/inet.h>
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <boost/json/parse.hpp>
+#include <csignal>
+#include <fstream>
+#include <sstream>
+
+#include "ChildProcess.h"
+#include "Eventually.h"
+#include "Files.h"
+#include "TemporaryFolder.h"
+#include "tarn/log/MetricLog.h"
+#include "tarn/service/Configuration.h"
+#include "tarn/sim/Simulator.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using bustest::ChildProcess;
+using bustest::contentsOf;
+using bustest::eventually;
+
+constexpr std::uint64_t kStartMs = 1'700'000'000'000;
+// The bound that Norvo's resident memory must stay under, whatever the rate offered.
+constexpr std::uint64_t kMostResidentKiB = 100 * 1024;
+
+// Two simulated hours of the drive, the metrics the shipped configuration subscribes to, as a
+// metric log with their delivery times. Answers how many lines it wrote.
+std::size_t writeDrive(const std::filesystem::path& path) {
+  const auto configuration = tarn::service::Configuration::parse(
+      contentsOf(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
+  tarn::sim::Simulator simulator(11, kStartMs);
+  std::ofstream out(path);
+  tarn::log::MetricLogWriter writer(out);
+  std::size_t lines = 0;
+  for (const tarn::sim::TimedMetric& timed : simulator.advance(2 * 3600 * 1000)) {
+    if (!configuration.profileOf(timed.metric.metricId)) continue;
+    writer.write({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
+                  {"kKeyPayload", timed.metric.payload}},
+                 static_cast<std::int64_t>(timed.atMs - kStartMs));
+    ++lines;
+  }
+  return lines;
+}
+
+// A port that was free a moment ago.
+int freePort() {
+  const int probe = ::socket(AF_INET, SOCK_STREAM, 0);
+  sockaddr_in address{};
+  address.sin_family = AF_INET;
+  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  socklen_t length = sizeof address;
+  ::bind(probe, reinterpret_cast<sockaddr*>(&address), sizeof address);
+  ::getsockname(probe, reinterpret_cast<sockaddr*>(&address), &length);
+  ::close(probe);
+  return ntohs(address.sin_port);
+}
+
+// The body of GET `path` on the loopback port, or empty when no whole answer came within 5 s.
+std::optional<std::string> get(int port, const std::string& path) {
+  const int connection = ::socket(AF_INET, SOCK_STREAM, 0);
+  const timeval timeout{.tv_sec = 5, .tv_usec = 0};
+  ::setsockopt(connection, SOL_SOCKET, SO_RCVTIMEO, &timeout, sizeof timeout);
+  ::setsockopt(connection, SOL_SOCKET, SO_SNDTIMEO, &timeout, sizeof timeout);
+  sockaddr_in address{};
+  address.sin_family = AF_INET;
+  address.sin_port = htons(static_cast<std::uint16_t>(port));
+  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  std::string answer;
+  if (::connect(connection, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0) {
+    const std::string request = "GET " + path + " HTTP/1.0\r\nHost: 127.0.0.1\r\n\r\n";
+    if (::send(connection, request.data(), request.size(), MSG_NOSIGNAL) ==
+        static_cast<ssize_t>(request.size())) {
+      char buffer[65536];
+      for (ssize_t got; (got = ::recv(connection, buffer, sizeof buffer, 0)) > 0;)
+        answer.append(buffer, static_cast<std::size_t>(got));
+    }
+  }
+  ::close(connection);
+  const std::size_t body = answer.find("\r\n\r\n");
+  if (!answer.starts_with("HTTP/1.") || body == std::string::npos) return std::nullopt;
+  return answer.substr(body + 4);
+}
+
+// The peak resident memory of a running process, from /proc.
+std::uint64_t peakResidentKiB(pid_t pid) {
+  std::ifstream status("/proc/" + std::to_string(pid) + "/status");
+  for (std::string line; std::getline(status, line);) {
+    if (line.starts_with("VmHWM:")) return std::stoull(line.substr(6));
+  }
+  return 0;
+}
+
+std::unique_ptr<ChildProcess> startNorvo(std::vector<std::string> arguments,
+                                         const std::filesystem::path& errors) {
+  arguments.insert(arguments.begin(), NORVO_VIEWER);
+  return std::make_unique<ChildProcess>(ChildProcess::Options{
+      .arguments = std::move(arguments),
+      .standardOutput = "/dev/null",
+      .standardError = errors,
+      .descriptor3 = std::nullopt,
+  });
+}
+
+class OverloadTest : public ::testing::Test {
+ protected:
+  static void SetUpTestSuite() {
+    folder_ = new bustest::TemporaryFolder;
+    lines_ = writeDrive(drive());
+  }
+  static void TearDownTestSuite() { delete folder_; }
+
+  static std::filesystem::path drive() { return *folder_ / "drive.jsonl"; }
+  static std::filesystem::path file(const std::string& name) { return *folder_ / name; }
+
+  static inline bustest::TemporaryFolder* folder_ = nullptr;
+  static inline std::size_t lines_ = 0;
+};
+
+TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoes) {
+  ASSERT_GT(lines_, 10'000u);
+  auto intake =
+      startNorvo({"intake", drive(), "--dump-store", file("intake.json")}, file("intake.err"));
+  ASSERT_EQ(intake->wait(60s), 0) << intake->standardError();
+  std::string expected = contentsOf(file("intake.json"));
+  ASSERT_TRUE(expected.ends_with('\n'));
+  expected.pop_back();
+
+  const int port = freePort();
+  auto norvo = startNorvo(
+      {"--replay", drive(), "--speed", "max", "--listen", "127.0.0.1:" + std::to_string(port)},
+      file("replay.err"));
+  std::optional<std::string> store;
+  EXPECT_TRUE(eventually([&] { return (store = get(port, "/api/store")) == expected; }, 60s))
+      << norvo->standardError();
+  const std::optional<std::string> status = get(port, "/api/status");
+  ASSERT_TRUE(status);
+  EXPECT_EQ(boost::json::parse(*status).at("dropped_events"), 0) << *status;
+  EXPECT_EQ(norvo->stop(SIGINT, 10s), 0) << norvo->standardError();
+}
+
+TEST_F(OverloadTest, TheIntakeFailsWhenItsLogLinesCannotBeWritten) {
+  auto intake = std::make_unique<ChildProcess>(ChildProcess::Options{
+      .arguments = {NORVO_VIEWER, "intake", drive()},
+      .standardOutput = "/dev/full",
+      .standardError = file("full.err"),
+      .descriptor3 = std::nullopt,
+  });
+  EXPECT_EQ(intake->wait(60s), 1);
+  EXPECT_NE(intake->standardError().find("norvo intake: cannot write the log lines to standard "
+                                         "output: No space left on device"),
+            std::string::npos)
+      << intake->standardError();
+}
+
+TEST_F(OverloadTest, ALoopingReplayWithoutPausesStaysSmallAnswersEveryPageAndEndsOnASignal) {
+  for (const int signal : {SIGINT, SIGTERM}) {
+    const int port = freePort();
+    auto norvo = startNorvo({"--replay", drive(), "--speed", "max", "--loop", "--listen",
+                             "127.0.0.1:" + std::to_string(port)},
+                            file("loop.err"));
+    ASSERT_TRUE(eventually([&] { return get(port, "/").has_value(); }, 20s))
+        << norvo->standardError();
+    const auto until = std::chrono::steady_clock::now() + 3s;
+    std::size_t answered = 0;
+    for (const char* page : {"/", "/LTE", "/api/screens/LTE/CA%20Status", "/api/store"}) {
+      ASSERT_TRUE(get(port, page)) << page;
+      ++answered;
+    }
+    while (std::chrono::steady_clock::now() < until) {
+      ASSERT_TRUE(get(port, "/LTE/Serving%20Cell%20Info"));
+      ++answered;
+    }
+    EXPECT_GT(answered, 4u);
+    EXPECT_LT(peakResidentKiB(norvo->pid()), kMostResidentKiB);
+    EXPECT_EQ(norvo->stop(signal, 10s), 0) << norvo->standardError();
+  }
+}
+
+TEST_F(OverloadTest, TheSimulatorAtItsFastestRecordsForTheTimeAskedAndStaysSmall) {
+  auto record = startNorvo({"record", file("fast.jsonl"), "--seconds", "1", "--speed", "10000"},
+                           file("record.err"));
+  std::uint64_t peak = 0;
+  EXPECT_TRUE(eventually(
+      [&] {
+        peak = std::max(peak, peakResidentKiB(record->pid()));
+        return record->wait(0ms).has_value();
+      },
+      20s));
+  EXPECT_LT(peak, kMostResidentKiB);
+  EXPECT_EQ(record->wait(0ms), 0) << record->standardError();
+  EXPECT_GT(bustest::lineCount(file("fast.jsonl")), 1000u);
+
+  auto absurd = startNorvo({"record", file("absurd.jsonl"), "--speed", "1e9"}, file("absurd.err"));
+  EXPECT_EQ(absurd->wait(10s), 2);
+  EXPECT_NE(absurd->standardError().find("--speed of the simulator is at most 10000, not 1e9"),
+            std::string::npos)
+      << absurd->standardError();
+}
+
+}  // namespace

@@ -29,10 +29,16 @@ using bustest::contentsOf;
 using bustest::eventually;
 
 constexpr std::uint64_t kStartMs = 1'700'000'000'000;
-// The bound that Norvo's resident memory must stay under, whatever the rate offered.
+// The bound that Norvo's resident memory must stay under, whatever the rate offered. Under
+// AddressSanitizer freed memory waits in a quarantine of up to 256 MB, with shadow memory
+// besides; the bound then still catches growth without end (gigabytes in seconds).
+#if defined(__SANITIZE_ADDRESS__)
+constexpr std::uint64_t kMostResidentKiB = 400 * 1024;
+#else
 constexpr std::uint64_t kMostResidentKiB = 100 * 1024;
+#endif
 
-// Two simulated hours of the drive, the metrics the shipped configuration subscribes to, as a
+// One simulated hour of the drive, the metrics the shipped configuration subscribes to, as a
 // metric log with their delivery times. Answers how many lines it wrote.
 std::size_t writeDrive(const std::filesystem::path& path) {
   const auto configuration = tarn::service::Configuration::parse(
@@ -41,7 +47,7 @@ std::size_t writeDrive(const std::filesystem::path& path) {
   std::ofstream out(path);
   tarn::log::MetricLogWriter writer(out);
   std::size_t lines = 0;
-  for (const tarn::sim::TimedMetric& timed : simulator.advance(2 * 3600 * 1000)) {
+  for (const tarn::sim::TimedMetric& timed : simulator.advance(3600 * 1000)) {
     if (!configuration.profileOf(timed.metric.metricId)) continue;
     writer.write({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
                   {"kKeyPayload", timed.metric.payload}},
@@ -126,7 +132,7 @@ class OverloadTest : public ::testing::Test {
 };
 
 TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoes) {
-  ASSERT_GT(lines_, 10'000u);
+  ASSERT_GT(lines_, 5000u);
   auto intake =
       startNorvo({"intake", drive(), "--dump-store", file("intake.json")}, file("intake.err"));
   ASSERT_EQ(intake->wait(60s), 0) << intake->standardError();

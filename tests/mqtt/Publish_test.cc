@@ -169,7 +169,7 @@ TEST(APublisher, RefusedForItsPasswordSaysSoOnceAndKeepsTakingMetrics) {
   for (const std::string& line : numberedLines(0, 20))
     publisher.publish(line);
 
-  EXPECT_THAT(log.plainLines(),
+  EXPECT_THAT(log.systemLines(),
               ElementsAreArray({"tarnd: the broker at 127.0.0.1:" + std::to_string(broker.port()) +
                                 " refused the connection: Connection Refused: not authorised."}));
   EXPECT_EQ(publisher.counts().accepted, 20u);
@@ -201,11 +201,11 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   {
     Publisher publisher(options);
     publisher.publish("must not pass");
-    EXPECT_TRUE(eventually([&] { return log.plainLines().size() > 0; }));
+    EXPECT_TRUE(eventually([&] { return log.systemLines().size() > 0; }));
     EXPECT_FALSE(publisher.counts().linked);
   }
   EXPECT_EQ(subscriber.payloadsOn(kMetrics).size(), 1u);
-  EXPECT_THAT(log.plainLines(), ::testing::Contains(HasSubstr("certificate verify failed")));
+  EXPECT_THAT(log.systemLines(), ::testing::Contains(HasSubstr("certificate verify failed")));
 }
 
 }  // namespace

@@ -69,8 +69,7 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
   platform::log::Capture log;
   auto transport = std::make_shared<tarn::mqtt::MqttTransport>(
       tarn::mqtt::RemoteDevice{address("fleet/car-3"), std::nullopt, "norvo"});
-  tarn::client::useTransport(transport);
-  RecordingSession session;
+  RecordingSession session(*transport);
   ASSERT_EQ(session.configure("0x3C4E04\n0x3CD313\n"), tarn::CommandResult{});
 
   auto publisher = std::make_unique<tarn::mqtt::Publisher>(
@@ -126,7 +125,6 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
   publisher.reset();
   ASSERT_TRUE(eventually([&] { return transport->device().status().status == "offline"; }));
   EXPECT_EQ(log.count("norvo: fleet/car-3 is offline (source: sim, seed 3)"), 1u);
-  tarn::client::useTransport(nullptr);
 }
 
 // The SIM files come once, at power-on: a viewer that comes later has them from the broker.
@@ -153,10 +151,10 @@ TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
   ASSERT_TRUE(eventually([&] { return publisher.counts().sent == 3; }));
 
   platform::log::Capture log;
-  tarn::client::useTransport(std::make_shared<tarn::mqtt::MqttTransport>(
-      tarn::mqtt::RemoteDevice{address("fleet/car-4"), std::nullopt, "norvo"}));
+  tarn::mqtt::MqttTransport transport(
+      tarn::mqtt::RemoteDevice{address("fleet/car-4"), std::nullopt, "norvo"});
   {
-    RecordingSession session;
+    RecordingSession session(transport);
     ASSERT_EQ(session.configure("0x3C4E04\n"), tarn::CommandResult{});
     const auto query = [&] {
       return session.perform(tarn::kCommandQueryMetric,
@@ -170,7 +168,6 @@ TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
     EXPECT_EQ(integerAt(answer, tarn::kKeyMetricID), kSimFiles);
     EXPECT_EQ(*answer.find(tarn::kKeyPayload)->asBytes(), (platform::Bytes{0x08, 3}));
   }
-  tarn::client::useTransport(nullptr);
   source.stop();
 }
 

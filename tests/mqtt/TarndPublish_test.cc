@@ -91,21 +91,24 @@ TEST(APublishingTarnd, RefusedByTheBrokerSaysSoOnceAndServesItsLocalClients) {
   Broker broker(folder.path(),
                 {.account = std::pair("car", "right"), .tls = {}, .persistent = false});
   bustest::PrivateBus bus;
-  tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(bus.address()));
+  tarn::dbus::BusTransport transport(bus.address());
   auto tarnd = startPublishingTarnd(bus.address(), broker.address("fleet", "car:wrong"), {},
                                     folder / "tarnd");
   ASSERT_TRUE(bus.waitForName(tarn::dbus::kBusName, true)) << tarnd->standardError();
   {
-    bustest::RecordingSession session;
+    bustest::RecordingSession session(transport);
     ASSERT_EQ(session.configure("0x3CD301\n0x3C4F6A\n0x3CD302\n0x3CD102\n0x3CD002\n"),
               tarn::CommandResult{});
     EXPECT_GE(session.waitFor(10).size(), 10u);
   }
-  tarn::client::useTransport(nullptr);
+  constexpr std::string_view kRefused =
+      "refused the connection: Connection Refused: not authorised.\n";
+  ASSERT_TRUE(eventually([&] {
+    return tarnd->standardError().find(kRefused) != std::string::npos;
+  })) << tarnd->standardError();
   std::this_thread::sleep_for(2s);  // the library tries again after 1 s, then 2 s
   EXPECT_FALSE(tarnd->wait(0ms));
-  const std::string output = tarnd->standardOutput();
-  EXPECT_THAT(output, HasSubstr("refused the connection: Connection Refused: not authorised.\n"));
+  const std::string output = tarnd->standardError();
   EXPECT_EQ(output.find("refused"), output.rfind("refused")) << output;
   EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0);
 }

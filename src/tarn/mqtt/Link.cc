@@ -114,7 +114,8 @@ void Link::report(const std::string& problem) {
     if (problem == lastProblem_) return;
     lastProblem_ = problem;
   }
-  platform::log::plain(options_.name + ": " + problem);
+  // Unbuffered on standard error, so that it is seen while the link stays down.
+  platform::log::warning(options_.name + ": " + problem);
 }
 
 void Link::onConnect(mosquitto* client, void* self, int code) {

@@ -300,7 +300,13 @@ class AGuardedSite : public ASite {
     return guarded.handle(request);
   }
 
-  Site guarded{pages, {true, {{"store", [] { return std::string(R"({"a":1})"); }}}, "s3cret"}};
+  Site guarded{pages,
+               {.anyHost = true,
+                .readings = {{"store", [] { return std::string(R"({"a":1})"); }}},
+                .queries = {},
+                .documents = {},
+                .routes = {},
+                .token = "s3cret"}};
 };
 
 TEST_F(AGuardedSite, AsksForItsTokenSetsItAsACookieOnceGivenAndTakesTheCookieFromThenOn) {

@@ -20,7 +20,7 @@ using ui::web::Request;
 using ui::web::Response;
 
 // Metrics handed over per task of the main queue, so that pages still answer in between.
-constexpr std::size_t kBatch = 2000;
+constexpr std::size_t kBatch = 200;
 // A speed beyond this is no replay any more; "max" says it better.
 constexpr double kMaxSpeed = 10000.0;
 constexpr std::size_t kMaxBody = 4096;

@@ -2,7 +2,7 @@
 
 const assert = require('node:assert/strict');
 const { after, before, test } = require('node:test');
-const { startBrowser, startNorvo, screenshot } = require('./norvo.js');
+const { startBrowser, startNorvo, screenshot, stopCleanly } = require('./norvo.js');
 
 let norvo;
 let browser;
@@ -17,9 +17,7 @@ before(async () => {
 after(async () => {
   await browser?.close();
   if (norvo) {
-    const { code, signal } = await norvo.stop();
-    assert.equal(signal, null, 'norvo was killed instead of stopping');
-    assert.equal(code, 0, 'norvo did not stop cleanly');
+    await stopCleanly(norvo);
   }
 });
 

@@ -1,6 +1,7 @@
 // Starts Norvo on a free loopback port and Debian's Chromium, for the browser tests.
 'use strict';
 
+const assert = require('node:assert/strict');
 const { spawn } = require('node:child_process');
 const fs = require('node:fs');
 const net = require('node:net');
@@ -90,6 +91,13 @@ function startProgram(args, addressLine) {
   };
 }
 
+// Stops Norvo as Ctrl-C would and checks that it ended cleanly.
+async function stopCleanly(norvo) {
+  const { code, signal } = await norvo.stop();
+  assert.equal(signal, null, 'norvo was killed instead of stopping');
+  assert.equal(code, 0, 'norvo did not stop cleanly');
+}
+
 async function startBrowser() {
   const profile = fs.mkdtempSync(path.join(os.tmpdir(), 'norvo-chromium-'));
   const context = await chromium.launchPersistentContext(profile, {
@@ -121,4 +129,4 @@ async function screenshot(page, name) {
   await page.screenshot({ path: path.join(artifacts, `${name}.png`) });
 }
 
-module.exports = { program, freePort, startNorvo, startProgram, startBrowser, screenshot };
+module.exports = { program, freePort, startNorvo, startProgram, stopCleanly, startBrowser, screenshot };

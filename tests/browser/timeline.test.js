@@ -8,7 +8,7 @@ const fs = require('node:fs');
 const os = require('node:os');
 const path = require('node:path');
 const { after, before, test } = require('node:test');
-const { program, freePort, startBrowser, startNorvo, screenshot } = require('./norvo.js');
+const { program, freePort, startBrowser, startNorvo, screenshot, stopCleanly } = require('./norvo.js');
 
 let folder;
 let norvo;
@@ -34,9 +34,7 @@ before(async () => {
 after(async () => {
   await browser?.close();
   if (norvo) {
-    const { code, signal } = await norvo.stop();
-    assert.equal(signal, null, 'norvo was killed instead of stopping');
-    assert.equal(code, 0, 'norvo did not stop cleanly');
+    await stopCleanly(norvo);
   }
   if (folder) fs.rmSync(folder, { recursive: true, force: true });
 });

@@ -41,6 +41,7 @@ asan-test: build-asan
 # Each fuzz target under libFuzzer, AddressSanitizer and UndefinedBehaviorSanitizer for
 # FUZZ_SECONDS, from its seed corpus in fuzz/corpus; prints the executions run.
 fuzz: deps
+	@tools/install-deps.sh fuzz
 	@$(call configure,$(FUZZ_BUILD),-DCMAKE_BUILD_TYPE=RelWithDebInfo -DCMAKE_CXX_COMPILER=clang++ -DNORVO_LIBFUZZER=ON -DNORVO_SANITIZE=ON -DNORVO_BENCHMARKS=OFF)
 	FUZZ_SECONDS=$(FUZZ_SECONDS) cmake --build $(FUZZ_BUILD) -j $(JOBS) --target fuzz
 

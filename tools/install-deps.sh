@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Installs the Debian packages Norvo needs that are missing; says nothing
-# when every one is already there.
+# when every one is already there. `install-deps.sh fuzz` adds what the
+# libFuzzer builds need.
 set -euo pipefail
 
 packages=(
@@ -13,8 +14,8 @@ packages=(
   libtomlplusplus-dev
   chromium nodejs
   tshark
-  clang libclang-rt-14-dev
 )
+[[ "${1:-}" == fuzz ]] && packages+=(clang libclang-rt-14-dev)
 
 missing=()
 for package in "${packages[@]}"; do

@@ -10,6 +10,7 @@ const std::string_view kFleetHtml = R"(<!DOCTYPE html>
 <title>Fleet</title>
 <link rel="icon" href="/assets/icon.svg">
 <link rel="stylesheet" href="/fleet/fleet.css">
+<script src="/assets/poll.js" defer></script>
 <script src="/fleet/fleet.js" defer></script>
 </head>
 <body>
@@ -109,8 +110,7 @@ for (const th of document.querySelectorAll('th')) {
   });
 }
 document.getElementById('filter').addEventListener('input', show);
-refresh();
-setInterval(refresh, 1000);
+norvoPoll(refresh, 1000);
 )";
 
 const std::string_view kFleetStyle = R"(/* The fleet page: a header and one table. */

@@ -50,7 +50,7 @@ constexpr HandlerStep kSimFileSteps[] = {
 
 using D = DisplayDictionary;
 
-constexpr Handler kHandlers[] = {
+constexpr Handler kGsmNasHandlers[] = {
     recordHandler<KCellularGsmScellInfo>(D::GSMScellInfo, "Received GSM Serving Cell Info ",
                                          kTimestampThenLog),
     recordHandler<KCellularGsmIdleConfig>(D::GSMIdleConfigInfo, "Received GSM Idle Config Info is ",
@@ -80,7 +80,7 @@ constexpr Handler kHandlers[] = {
 }  // namespace
 
 std::span<const Handler> gsmNasHandlers() {
-  return kHandlers;
+  return kGsmNasHandlers;
 }
 
 }  // namespace store

@@ -87,7 +87,7 @@ constexpr HandlerStep kInterRatSteps[] = {
 
 using D = DisplayDictionary;
 
-constexpr Handler kHandlers[] = {
+constexpr Handler kLteHandlers[] = {
     recordHandler<KCellularLteRrcState>(D::LTERRCState, "Current RRC state is ", kTimestampThenLog),
     recordHandler<KCellularLteCdrxConfig>(D::LTECDRXConfig, "Current CDRX Config is ",
                                           kTimestampThenLog),
@@ -114,7 +114,7 @@ constexpr Handler kHandlers[] = {
 }  // namespace
 
 std::span<const Handler> lteHandlers() {
-  return kHandlers;
+  return kLteHandlers;
 }
 
 }  // namespace store

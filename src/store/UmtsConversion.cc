@@ -54,7 +54,7 @@ constexpr HandlerStep kNeighbourSteps[] = {
 
 using D = DisplayDictionary;
 
-constexpr Handler kHandlers[] = {
+constexpr Handler kUmtsHandlers[] = {
     recordHandler<KCellularWcdmaRrcConnectionState>(
         D::UMTSRRCState, "Received UMTS RRC Connection State is ", kTimestampThenLog),
     recordHandler<KCellularWcdmaRrcConfiguration>(
@@ -73,7 +73,7 @@ constexpr Handler kHandlers[] = {
 }  // namespace
 
 std::span<const Handler> umtsHandlers() {
-  return kHandlers;
+  return kUmtsHandlers;
 }
 
 }  // namespace store

@@ -22,8 +22,6 @@ namespace {
 constexpr std::uint64_t kCallTimeoutMicroseconds = 5'000'000;
 
 const std::string kService(kBusName);
-const std::string kManager(kManagerInterface);
-const std::string kSession(kSessionInterface);
 
 CommandResult serviceGone(const std::string& reason) {
   return {status::kServiceUnavailable, "the baseband manager service has gone away: " + reason};
@@ -112,7 +110,8 @@ BusConnection::~BusConnection() {
   loop_.call([this] {
     if (!session_) return;
     try {
-      sdbus::MethodCall close = session_->createMethodCall(kSession, std::string(kClose));
+      sdbus::MethodCall close =
+          session_->createMethodCall(kSessionInterfaceName, std::string(kClose));
       close.dontExpectReply();
       session_->callMethod(close);
     } catch (const sdbus::Error&) {
@@ -145,7 +144,8 @@ void BusConnection::setEventsOn(bool on) {
 
 bool BusConnection::openSession() {
   try {
-    sdbus::MethodCall open = manager_->createMethodCall(kManager, std::string(kOpenSession));
+    sdbus::MethodCall open =
+        manager_->createMethodCall(kManagerInterfaceName, std::string(kOpenSession));
     open << clientName_;
     sdbus::MethodReply reply = manager_->callMethod(open, kCallTimeoutMicroseconds);
     sdbus::ObjectPath path;
@@ -208,7 +208,8 @@ CommandResult BusConnection::callPerformCommand(std::string_view command,
     return {status::kInvalidArgument, "the command's arguments are not a dictionary"};
   }
   try {
-    sdbus::MethodCall call = session_->createMethodCall(kSession, std::string(kPerformCommand));
+    sdbus::MethodCall call =
+        session_->createMethodCall(kSessionInterfaceName, std::string(kPerformCommand));
     call << std::string(command);
     appendRecord(call, input);
     sdbus::MethodReply reply = session_->callMethod(call, kCallTimeoutMicroseconds);
@@ -235,7 +236,8 @@ void BusConnection::noteFailedCall(const sdbus::Error& error) {
 
 void BusConnection::callSetEventsOn() {
   try {
-    sdbus::MethodCall call = session_->createMethodCall(kSession, std::string(kSetEventsOn));
+    sdbus::MethodCall call =
+        session_->createMethodCall(kSessionInterfaceName, std::string(kSetEventsOn));
     call << eventsOn_;
     session_->callMethod(call, kCallTimeoutMicroseconds);
   } catch (const sdbus::Error& error) {

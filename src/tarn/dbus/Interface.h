@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string>
 #include <string_view>
 
 // The baseband manager service on D-Bus, as org.norvo.Tarn1.xml describes it. The major version
@@ -15,6 +16,9 @@ inline constexpr std::string_view kSessionPathPrefix = "/org/norvo/Tarn1/session
 
 inline constexpr std::string_view kManagerInterface = "org.norvo.Tarn1.Manager";
 inline constexpr std::string_view kSessionInterface = "org.norvo.Tarn1.Session";
+// The same names as sdbus-c++ takes them.
+inline const std::string kManagerInterfaceName{kManagerInterface};
+inline const std::string kSessionInterfaceName{kSessionInterface};
 
 // Manager methods and properties.
 inline constexpr std::string_view kOpenSession = "OpenSession";

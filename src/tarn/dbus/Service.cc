@@ -17,9 +17,6 @@ namespace {
 constexpr std::size_t kMaxQueuedEvents = 100'000;
 constexpr std::size_t kFallingBehind = 10'000;
 
-const std::string kManager(kManagerInterface);
-const std::string kSession(kSessionInterface);
-
 std::string sessionPath(service::Core::SessionId id) {
   return platform::format("%s%llu", kSessionPathPrefix, id);
 }
@@ -54,12 +51,12 @@ Service::Service(std::shared_ptr<service::Core> core,
 void Service::publish() {
   sdbus::IConnection& bus = loop_.connection();
   manager_ = sdbus::createObject(bus, std::string(kManagerPath));
-  manager_->registerMethod(kManager, std::string(kOpenSession), "s", {"client_name"}, "o",
-                           {"session"}, [this](sdbus::MethodCall call) { openSession(call); });
+  manager_->registerMethod(kManagerInterfaceName, std::string(kOpenSession), "s", {"client_name"},
+                           "o", {"session"}, [this](sdbus::MethodCall call) { openSession(call); });
   sdbus::Flags constant;
   constant.set(sdbus::Flags::CONST_PROPERTY_VALUE);
   manager_->registerProperty(
-      kManager, std::string(kVersionProperty), "u",
+      kManagerInterfaceName, std::string(kVersionProperty), "u",
       [](sdbus::PropertyGetReply& reply) { reply << kInterfaceVersion; }, constant);
   manager_->finishRegistration();
   peersLeaving_ = bus.addMatch(
@@ -116,15 +113,15 @@ void Service::openSession(sdbus::MethodCall& call) {
   session->owner = owner;
   session->object = sdbus::createObject(loop_.connection(), sessionPath(id));
   sdbus::IObject& object = *session->object;
-  object.registerMethod(kSession, std::string(kPerformCommand), "sa{sv}", {"command", "arguments"},
-                        "is", {"status", "message"},
+  object.registerMethod(kSessionInterfaceName, std::string(kPerformCommand), "sa{sv}",
+                        {"command", "arguments"}, "is", {"status", "message"},
                         [this, id](sdbus::MethodCall method) { performCommand(id, method); });
-  object.registerMethod(kSession, std::string(kSetEventsOn), "b", {"on"}, "", {},
+  object.registerMethod(kSessionInterfaceName, std::string(kSetEventsOn), "b", {"on"}, "", {},
                         [this, id](sdbus::MethodCall method) { setEventsOn(id, method); });
-  object.registerMethod(kSession, std::string(kClose), "", {}, "", {},
+  object.registerMethod(kSessionInterfaceName, std::string(kClose), "", {}, "", {},
                         [this, id](sdbus::MethodCall method) { closeSession(id, method); });
-  object.registerSignal(kSession, std::string(kEventsSignal), std::string(kEventsSignature),
-                        {"events"});
+  object.registerSignal(kSessionInterfaceName, std::string(kEventsSignal),
+                        std::string(kEventsSignature), {"events"});
   object.finishRegistration();
   sessions_.emplace(id, std::move(session));
 
@@ -239,7 +236,8 @@ void Service::sendQueued() {
     if (found == sessions_.end()) continue;
     Session& session = *found->second;
     try {
-      sdbus::Signal signal = session.object->createSignal(kSession, std::string(kEventsSignal));
+      sdbus::Signal signal =
+          session.object->createSignal(kSessionInterfaceName, std::string(kEventsSignal));
       signal.setDestination(session.owner);
       appendEvents(signal, events);
       session.object->emitSignal(signal);

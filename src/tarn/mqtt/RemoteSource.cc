@@ -16,7 +16,7 @@ bool isBasebandMetric(std::int64_t metricId) {
   return (metricId >> 16) == 0x3C;
 }
 
-ReadMetric refuse(std::string error) {
+ReadMetric refuseMetric(std::string error) {
   return {std::nullopt, std::move(error)};
 }
 
@@ -29,16 +29,17 @@ std::string textAt(const boost::json::object& object, std::string_view key) {
 
 ReadMetric readMetricMessage(std::string_view message) {
   if (message.size() > kLargestMetricMessage)
-    return refuse("too large (" + std::to_string(message.size()) + " bytes)");
+    return refuseMetric("too large (" + std::to_string(message.size()) + " bytes)");
   const log::ParsedLine parsed = log::parseMetricLogLine(message);
-  if (!parsed.entry) return refuse(parsed.error);
+  if (!parsed.entry) return refuseMetric(parsed.error);
   const platform::Dictionary& record = parsed.entry->record;
   const platform::Value* id = record.find(kKeyMetricID);
   const std::optional<std::int64_t> metricId = id ? id->asInteger() : std::nullopt;
-  if (!metricId) return refuse("no integer \"kKeyMetricID\"");
-  if (!isBasebandMetric(*metricId)) return refuse("unknown metric ID " + std::to_string(*metricId));
+  if (!metricId) return refuseMetric("no integer \"kKeyMetricID\"");
+  if (!isBasebandMetric(*metricId))
+    return refuseMetric("unknown metric ID " + std::to_string(*metricId));
   const platform::Value* payload = record.find(kKeyPayload);
-  if (payload == nullptr || !payload->isBytes()) return refuse("no \"kKeyPayload\"");
+  if (payload == nullptr || !payload->isBytes()) return refuseMetric("no \"kKeyPayload\"");
   return {service::Metric{static_cast<std::uint32_t>(*metricId), *payload->asBytes()}, {}};
 }
 

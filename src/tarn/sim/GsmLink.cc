@@ -3,20 +3,20 @@
 namespace tarn::sim {
 namespace {
 
-constexpr double kSuitableDbm = -104.0;
+constexpr double kGsmSuitableDbm = -104.0;
 constexpr double kReselectHysteresisDb = 4.0;  // CELL_RESELECT_HYSTERESIS
 constexpr double kUmtsRscpDbm = -98.0;
 constexpr double kUmtsEcnoDb = -12.0;
 constexpr double kLteRsrpDbm = -108.0;
 
-constexpr double kReselectionMs = 5000.0;
+constexpr double kGsmReselectionMs = 5000.0;
 constexpr double kInterRatMs = 3000.0;
 
 }  // namespace
 
 std::optional<std::size_t> GsmLink::suitableCell(const Step& step) const {
   const auto best = step.radio.bestGsm([](std::size_t) { return true; });
-  if (best && step.radio.gsm()[*best].rxlevDbm > kSuitableDbm) return best;
+  if (best && step.radio.gsm()[*best].rxlevDbm > kGsmSuitableDbm) return best;
   return std::nullopt;
 }
 
@@ -61,7 +61,7 @@ void GsmLink::reselect(const Step& step) {
   const bool better =
       best && *best != *state_.serving &&
       levels[*best].rxlevDbm > levels[*state_.serving].rxlevDbm + kReselectHysteresisDb;
-  if (!candidate_.settled(better ? best : std::nullopt, step.ms, kReselectionMs)) return;
+  if (!candidate_.settled(better ? best : std::nullopt, step.ms, kGsmReselectionMs)) return;
   state_.serving = best;
   step.report(Change::GsmCell);
 }

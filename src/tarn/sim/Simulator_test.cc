@@ -20,11 +20,11 @@ namespace {
 using namespace messages;
 namespace id = messages::metric;
 
-constexpr std::uint64_t kStartMs = 1'700'000'000'000;
+constexpr std::uint64_t kSimulatorStartMs = 1'700'000'000'000;
 constexpr std::uint64_t kTenMinutesMs = 600'000;
 
 std::vector<TimedMetric> driveFor(std::uint64_t seed, std::uint64_t ms) {
-  Simulator simulator(seed, kStartMs);
+  Simulator simulator(seed, kSimulatorStartMs);
   return simulator.advance(ms);
 }
 
@@ -60,7 +60,7 @@ TEST(ASimulator, ProducesTheSameBytesForTheSameSeedAndOthersForAnother) {
 
 TEST(ASimulator, GivesTheSameStreamHoweverTimeIsSliced) {
   const auto whole = driveFor(5, 60'000);
-  Simulator sliced(5, kStartMs);
+  Simulator sliced(5, kSimulatorStartMs);
   std::vector<TimedMetric> pieces;
   for (std::uint64_t slice : {37u, 250u, 1u, 999u}) {
     for (int i = 0; i < 15; ++i) {
@@ -71,7 +71,7 @@ TEST(ASimulator, GivesTheSameStreamHoweverTimeIsSliced) {
   auto rest = sliced.advance(60'000 - 15 * (37 + 250 + 1 + 999));
   pieces.insert(pieces.end(), rest.begin(), rest.end());
   EXPECT_TRUE(sameStream(whole, pieces));
-  EXPECT_EQ(sliced.nowMs(), kStartMs + 60'000);
+  EXPECT_EQ(sliced.nowMs(), kSimulatorStartMs + 60'000);
 }
 
 // One drive shared by the tests below: out of the city, through the countryside into the
@@ -99,7 +99,7 @@ class TenMinuteDrive : public ::testing::Test {
 
 TEST_F(TenMinuteDrive, DeliversEveryMetricKindInTimeOrderStampedWithItsDeliveryTime) {
   std::set<std::uint32_t> seen;
-  std::uint64_t previous = kStartMs;
+  std::uint64_t previous = kSimulatorStartMs;
   for (const TimedMetric& m : all()) {
     seen.insert(m.metric.metricId);
     EXPECT_GE(m.atMs, previous);
@@ -323,7 +323,7 @@ TEST_F(TenMinuteDrive, RegistersAndMovesBearersWithTheRat) {
 }
 
 TEST(TheSimFiles, HoldTheSubscriptionTheNasReports) {
-  Simulator simulator(9, kStartMs);
+  Simulator simulator(9, kSimulatorStartMs);
   const auto metrics = simulator.advance(5'000);
   const service::Metric query = simulator.simFiles();
   EXPECT_EQ(query.metricId, id::KCellularSimCardFiles);

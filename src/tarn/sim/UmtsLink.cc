@@ -15,11 +15,11 @@ constexpr double kWeakRscpDbm = -114.0;
 constexpr double kGsmHandoverRscpDbm = -108.0;  // event 3A: the used frequency is poor
 constexpr double kGsmHandoverDbm = -95.0;       // and the GSM cell good
 constexpr double kWeakEcnoDb = -20.0;
-constexpr double kIdleHysteresisDb = 4.0;
+constexpr double kUmtsIdleHysteresisDb = 4.0;
 constexpr double kSoftHandoverDb = 3.0;
 
 // Timers in milliseconds.
-constexpr double kReselectionMs = 1000.0;
+constexpr double kUmtsReselectionMs = 1000.0;
 constexpr double kSoftHandoverMs = 640.0;
 constexpr double kLteReselectionMs = 2000.0;
 constexpr double kLteHandoverMs = 3000.0;
@@ -86,7 +86,7 @@ UmtsLink::Exit UmtsLink::step(const Step& step, const Needs& needs) {
         pagingOnly_.reset();
         setRrc(step, Rrc::KWCDMA_RRC_CONN_STATE_URA_PCH);
       } else {
-        reselect(step, kIdleHysteresisDb, kReselectionMs);
+        reselect(step, kUmtsIdleHysteresisDb, kUmtsReselectionMs);
       }
       return Exit::None;
     case Rrc::KWCDMA_RRC_CONN_STATE_RADIO_LINK_FAILURE:
@@ -110,7 +110,7 @@ UmtsLink::Exit UmtsLink::stepCamped(const Step& step, const Needs& needs) {
   const UmtsLevel& level = step.radio.umts()[*state_.serving];
   const bool poor = level.rscpDbm < kSuitableRscpDbm + 2.0 || level.ecnoDb < kSuitableEcnoDb;
   if (poor && gsmInReach(step, kGsmAcceptDbm)) return Exit::ToGsm;
-  reselect(step, kIdleHysteresisDb, kReselectionMs);
+  reselect(step, kUmtsIdleHysteresisDb, kUmtsReselectionMs);
 
   if (!needs.data && !needs.signalling) return Exit::None;
   if (state_.rrc == Rrc::KWCDMA_RRC_CONN_STATE_IDLE) {

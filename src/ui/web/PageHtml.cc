@@ -81,6 +81,7 @@ std::string renderHtml(const PageView& page) {
   // The chrome beside the table: links to the other views, alerts and a replay's player bar.
   out +=
       "<link rel=\"stylesheet\" href=\"/assets/chrome.css\">\n"
+      "<script src=\"/assets/poll.js\" defer></script>\n"
       "<script src=\"/assets/norvo.js\" defer></script>\n"
       "<script src=\"/assets/chrome.js\" defer></script>\n</head>\n<body>\n<header class=\"bar\">";
   if (page.back) {

@@ -21,7 +21,7 @@ namespace {
 constexpr std::size_t kMaxTarget = 2048;
 constexpr std::string_view kScreensApi = "/api/screens";
 constexpr std::string_view kApi = "/api/";
-constexpr std::string_view kAssets = "/assets/";
+constexpr std::string_view kAssetsPrefix = "/assets/";
 
 ErrorFormat formatFor(std::string_view path) {
   return path.starts_with(kApi) || path == kScreensApi ? ErrorFormat::Json : ErrorFormat::Html;
@@ -68,7 +68,7 @@ Response Site::route(const Request& request, std::string_view path) {
     return error(request, http::status::method_not_allowed, formatFor(path));
   if (!path.starts_with('/')) return error(request, http::status::bad_request, ErrorFormat::Html);
 
-  if (path.starts_with(kAssets)) return asset(request, path.substr(kAssets.size()));
+  if (path.starts_with(kAssetsPrefix)) return asset(request, path.substr(kAssetsPrefix.size()));
   if (path == kScreensApi) return screenPage(request, "/", true);
   if (path.starts_with(kScreensApi) && path[kScreensApi.size()] == '/')
     return screenPage(request, path.substr(kScreensApi.size()), true);

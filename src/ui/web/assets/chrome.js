@@ -154,23 +154,12 @@
   // {"alerts": [{"text"}...], "replay": the replay's state, or null}.
   let showReplay = null;
   const period = 500;
-  let inFlight = false;
-  async function refresh() {
-    if (inFlight || document.visibilityState !== 'visible') return;
-    inFlight = true;
-    try {
-      const chrome = await getJson('/api/chrome');
-      showAlerts(chrome.alerts);
-      if (chrome.replay) {
-        if (showReplay) showReplay(chrome.replay);
-        else showReplay = buildPlayer(chrome.replay);
-      }
-    } catch (error) {
-      // Norvo may be restarting; the next tick asks again.
-    } finally {
-      inFlight = false;
+  norvoPoll(async () => {
+    const chrome = await getJson('/api/chrome');
+    showAlerts(chrome.alerts);
+    if (chrome.replay) {
+      if (showReplay) showReplay(chrome.replay);
+      else showReplay = buildPlayer(chrome.replay);
     }
-  }
-  refresh();
-  setInterval(refresh, period);
+  }, period);
 })();

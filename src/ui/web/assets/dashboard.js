@@ -25,8 +25,6 @@
   const graphs = []; // {id, series: [definition], plot, element}
   let serverOffset = 0; // server time - browser time, ms
   let view = readView();
-  let ticker = null;
-  let inFlight = false;
 
   // What the address says to show: {window} live, or {from, to} zoomed.
   function readView() {
@@ -367,30 +365,7 @@
     fillSubscriber(card.subscriber);
   }
 
-  // ---- Refresh ----
-
-  async function refresh() {
-    if (inFlight) return;
-    inFlight = true;
-    try {
-      await Promise.all([refreshCard(), refreshSeries()]);
-    } catch (error) {
-      // Norvo may be restarting; the next tick asks again.
-    } finally {
-      inFlight = false;
-    }
-  }
-
-  function stop() {
-    if (ticker !== null) clearInterval(ticker);
-    ticker = null;
-  }
-
-  function start() {
-    stop();
-    if (document.visibilityState !== 'visible') return;
-    ticker = setInterval(refresh, period);
-  }
+  // ---- Controls, and reading once a second ----
 
   for (const button of document.querySelectorAll('[data-window]')) {
     button.addEventListener('click', () => goLive(Number(button.dataset.window)));
@@ -406,18 +381,6 @@
     for (const graph of graphs) graph.plot.setSize({ width: plotWidth(graph.element), height: 180 });
   }).observe(graphsElement);
   matchMedia('(prefers-color-scheme: dark)').addEventListener('change', rebuildPlots);
-  document.addEventListener('visibilitychange', () => {
-    if (document.visibilityState === 'visible') refresh();
-    start();
-  });
-  window.addEventListener('pagehide', stop);
-  window.addEventListener('pageshow', (event) => {
-    if (event.persisted) {
-      refresh();
-      start();
-    }
-  });
   updateButtons();
-  refresh();
-  start();
+  norvoPoll(() => Promise.all([refreshCard(), refreshSeries()]), period);
 })();

@@ -9,8 +9,6 @@
   const source = table.dataset.source;
   const heading = document.querySelector('.bar h1');
   const period = 1000;
-  let ticker = null;
-  let inFlight = false;
 
   function setText(element, text) {
     const wanted = text ?? '';
@@ -84,40 +82,8 @@
     });
   }
 
-  async function refresh() {
-    if (inFlight) return;
-    inFlight = true;
-    try {
-      const response = await fetch(source, { cache: 'no-store', headers: { Accept: 'application/json' } });
-      if (response.ok) patch(await response.json());
-    } catch (error) {
-      // Norvo may be restarting; the next tick asks again.
-    } finally {
-      inFlight = false;
-    }
-  }
-
-  function stop() {
-    if (ticker !== null) clearInterval(ticker);
-    ticker = null;
-  }
-
-  function start() {
-    stop();
-    if (document.visibilityState !== 'visible') return;
-    ticker = setInterval(refresh, period);
-  }
-
-  document.addEventListener('visibilitychange', () => {
-    if (document.visibilityState === 'visible') refresh();
-    start();
-  });
-  window.addEventListener('pagehide', stop);
-  window.addEventListener('pageshow', (event) => {
-    if (event.persisted) {
-      refresh();
-      start();
-    }
-  });
-  start();
+  norvoPoll(async () => {
+    const response = await fetch(source, { cache: 'no-store', headers: { Accept: 'application/json' } });
+    if (response.ok) patch(await response.json());
+  }, period);
 })();

@@ -11,7 +11,6 @@
   const shown = 500;
   let epoch = null;
   let lastId = 0;
-  let inFlight = false;
 
   const timeFormat = new Intl.DateTimeFormat(undefined, {
     year: 'numeric', month: '2-digit', day: '2-digit',
@@ -58,35 +57,26 @@
     metric.hidden = true;
   }
 
-  async function refresh() {
-    if (inFlight) return;
-    inFlight = true;
-    try {
-      const response = await fetch(`/api/events?${query()}`, { cache: 'no-store' });
-      if (!response.ok) return;
-      const answer = await response.json();
-      if (epoch !== null && answer.epoch !== epoch) {
-        // The events were found again from the start (a seek in a replay).
-        epoch = answer.epoch;
-        startOver();
-        inFlight = false;
-        return refresh();
-      }
+  async function read() {
+    const response = await fetch(`/api/events?${query()}`, { cache: 'no-store' });
+    if (!response.ok) return;
+    const answer = await response.json();
+    if (epoch !== null && answer.epoch !== epoch) {
+      // The events were found again from the start (a seek in a replay).
       epoch = answer.epoch;
-      if (answer.events.length > 0) {
-        list.querySelector('.empty')?.remove();
-        const fresh = document.createDocumentFragment();
-        for (const event of answer.events) fresh.appendChild(makeItem(event));
-        list.insertBefore(fresh, list.firstChild);
-        lastId = Math.max(lastId, answer.events[0].id);
-        while (list.children.length > shown) list.lastElementChild.remove();
-      }
-      showEmpty();
-    } catch (error) {
-      // Norvo may be restarting; the next tick asks again.
-    } finally {
-      inFlight = false;
+      startOver();
+      return read();
     }
+    epoch = answer.epoch;
+    if (answer.events.length > 0) {
+      list.querySelector('.empty')?.remove();
+      const fresh = document.createDocumentFragment();
+      for (const event of answer.events) fresh.appendChild(makeItem(event));
+      list.insertBefore(fresh, list.firstChild);
+      lastId = Math.max(lastId, answer.events[0].id);
+      while (list.children.length > shown) list.lastElementChild.remove();
+    }
+    showEmpty();
   }
 
   async function showMetric(item) {
@@ -113,8 +103,5 @@
     startOver();
     refresh();
   });
-  refresh();
-  setInterval(() => {
-    if (document.visibilityState === 'visible') refresh();
-  }, period);
+  const refresh = norvoPoll(read, period);
 })();

@@ -8,6 +8,7 @@
 #include <string>
 
 #include "ChildProcess.h"
+#include "CpuTime.h"
 #include "DeliveryPipeline.h"
 #include "PrivateBus.h"
 #include "Tarnd.h"
@@ -18,6 +19,8 @@
 
 namespace {
 
+using cputime::cpuSecondsOf;
+using cputime::statusMebibytes;
 using delivery::BM_DeliveryLatencyAt1000PerSecond;
 using delivery::BM_DeliveryThroughput;
 
@@ -30,36 +33,6 @@ struct BusPath {
     return std::make_shared<tarn::dbus::BusTransport>(bus.address());
   }};
 };
-
-// User and system CPU time of a process, in seconds.
-double cpuSecondsOf(pid_t pid) {
-  std::ifstream stat("/proc/" + std::to_string(pid) + "/stat");
-  std::string line;
-  std::getline(stat, line);
-  // The fields after the command's name, which is in parentheses and may hold spaces.
-  std::istringstream fields(line.substr(line.rfind(')') + 2));
-  std::string field;
-  unsigned long long user = 0, system = 0;
-  for (int index = 3; fields >> field; ++index) {
-    if (index == 14) user = std::stoull(field);
-    if (index == 15) {
-      system = std::stoull(field);
-      break;
-    }
-  }
-  return static_cast<double>(user + system) / static_cast<double>(sysconf(_SC_CLK_TCK));
-}
-
-// A line of /proc/PID/status, such as VmRSS, in MiB.
-double statusMebibytes(pid_t pid, std::string_view key) {
-  std::ifstream status("/proc/" + std::to_string(pid) + "/status");
-  for (std::string line; std::getline(status, line);) {
-    if (line.starts_with(key) && line.size() > key.size() && line[key.size()] == ':') {
-      return std::stod(line.substr(key.size() + 1)) / 1024.0;  // given in kB
-    }
-  }
-  return 0.0;
-}
 
 std::size_t linesSaying(const std::filesystem::path& path, std::string_view text) {
   std::ifstream file(path);

@@ -16,6 +16,7 @@
 
 #include "Broker.h"
 #include "ChildProcess.h"
+#include "CpuTime.h"
 #include "Eventually.h"
 #include "TemporaryFolder.h"
 #include "fleet/Fleet.h"
@@ -28,39 +29,12 @@
 namespace {
 
 using namespace std::chrono_literals;
+using cputime::cpuSecondsOf;
+using cputime::processCpuSeconds;
+using cputime::threadCpuSeconds;
 
 // About an encoded LTE serving-cell measurement with its two receive measurements.
 const tarn::service::Metric kMetric{0x3CD301, platform::Bytes(48, 0x5A)};
-
-double threadCpuSeconds() {
-  timespec time{};
-  clock_gettime(CLOCK_THREAD_CPUTIME_ID, &time);
-  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
-
-double processCpuSeconds() {
-  timespec time{};
-  clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
-  return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
-}
-
-// User and system CPU time of another process, in seconds.
-double cpuSecondsOf(pid_t pid) {
-  std::ifstream stat("/proc/" + std::to_string(pid) + "/stat");
-  std::string line;
-  std::getline(stat, line);
-  std::istringstream fields(line.substr(line.rfind(')') + 2));
-  std::string field;
-  unsigned long long user = 0, system = 0;
-  for (int index = 3; fields >> field; ++index) {
-    if (index == 14) user = std::stoull(field);
-    if (index == 15) {
-      system = std::stoull(field);
-      break;
-    }
-  }
-  return static_cast<double>(user + system) / static_cast<double>(sysconf(_SC_CLK_TCK));
-}
 
 std::int64_t unixMs() {
   return std::chrono::duration_cast<std::chrono::milliseconds>(

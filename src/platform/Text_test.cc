@@ -1,12 +1,12 @@
 #include <gtest/gtest.h>
+#include <unicode/locid.h>
+#include <unicode/smpdtfmt.h>
+#include <unicode/timezone.h>
 
 #include <cmath>
 #include <cstdlib>
 #include <limits>
 #include <string>
-#include <unicode/locid.h>
-#include <unicode/smpdtfmt.h>
-#include <unicode/timezone.h>
 
 #include "platform/Base64.h"
 #include "platform/DateFormat.h"

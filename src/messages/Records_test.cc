@@ -160,29 +160,20 @@ TEST(ARecord, ComesOutOfInitWithDataOnlyWhenThePayloadDecodesCleanly) {
 }
 
 TEST(AnEnum, ShowsItsNameOrTheUnknownValue) {
-  struct Case {
-    Bytes payload;
-    std::string expected;
-  };
   const auto rrcText = [](std::uint64_t cause) {
     return Value(decode<KCellularLteRrcState>(Payload().varint(5, cause).data())
                      ->dictionaryRepresentation())
         .description();
   };
-  EXPECT_EQ(rrcText(254), "[\"cause\": \"KLTE_RRC_CAUSE_NO_SERVICE\"]");
   EXPECT_EQ(rrcText(255), "[\"cause\": \"KLTE_RRC_CAUSE_NA\"]");
   EXPECT_EQ(rrcText(31), "[\"cause\": \"(unknown: 31)\"]");
   EXPECT_EQ(rrcText(0xFFFFFFFFFFFFFFFF), "[\"cause\": \"(unknown: -1)\"]");
-
   const auto wcdma = decode<KCellularWcdmaRrcConnectionState>(Payload().varint(2, 11).data());
   EXPECT_EQ(*wcdma->dictionaryRepresentation().find("state"), Value("(unknown: 11)"));
 
   const auto cell = decode<KCellularWcdmaCellInfo>(Payload().varint(8, 2).varint(14, 3).data());
   EXPECT_EQ(*cell->dictionaryRepresentation().find("wcdma_band"), Value("(unknown: 2)"));
-  EXPECT_EQ(*cell->dictionaryRepresentation().find("hspa"),
-            Value("SYS_HS_IND_HSDPA_HSUPA_SUPP_CELL"));
   const auto gsmCell = decode<KCellularGsmScellInfo>(Payload().varint(8, 168).varint(11, 0).data());
-  EXPECT_EQ(*gsmCell->dictionaryRepresentation().find("gsm_band"), Value("SYS_BAND_UMTS_BAND6"));
   EXPECT_EQ(*gsmCell->dictionaryRepresentation().find("state"), Value("(unknown: 0)"));
 }
 
@@ -194,81 +185,6 @@ TEST(AnEnum, ReadsAsItsDefaultWhileAbsent) {
   mm.setUpdateStatus(KCellularMmContext::STATUS_ROAMING_NOT_ALLOWED);
   mm.setHasUpdateStatus(false);
   EXPECT_EQ(mm.updateStatus(), KCellularMmContext::STATUS_UPDATED);
-}
-
-TEST(ADictionary, UsesTheSchemaKeysAndKeepsEachNumbersKind) {
-  KCellularLteSelReselCellInfo info;
-  info.setTimestamp(1500000000000);
-  info.setQRxLevMin(-64);
-  info.setQHyst(4);
-  auto neighbour = std::make_shared<NbrEutra>();
-  neighbour->setThresXHighP(12);
-  neighbour->setFrameType(NbrEutra::TDD);
-  info.addNbrEutra(neighbour);
-  const std::uint32_t bands[] = {3, 7};
-  info.setMultiBandInfos(bands, 2);
-  const auto dictionary = info.dictionaryRepresentation();
-  EXPECT_EQ(Value(dictionary).description(),
-            "[\"timestamp\": 1500000000000, \"multi_band_info\": [3, 7], \"QRxLevMin\": -64, "
-            "\"Q_hyst\": 4, "
-            "\"nbr_eutra\": [[\"Thres_X_highP\": 12, \"frame_type\": \"TDD\"]]]");
-  EXPECT_EQ(dictionary.find("timestamp")->kind(), Value::Kind::UInt64);
-  EXPECT_EQ(dictionary.find("QRxLevMin")->kind(), Value::Kind::Int32);
-  EXPECT_EQ(dictionary.find("Q_hyst")->kind(), Value::Kind::UInt32);
-
-  SecondaryComponentCarrier carrier;
-  carrier.setHasUplink(false);
-  EXPECT_TRUE(carrier.hasHasUplink());
-  EXPECT_EQ(carrier.dictionaryRepresentation().find("has_uplink")->kind(), Value::Kind::Bool);
-}
-
-TEST(ADictionary, HoldsByteBuffersAsBytesAndLeavesEmptyListsOut) {
-  KCellularMmCommonInfo info;
-  info.setImsi(Bytes{0x09, 0x10});
-  const auto dictionary = info.dictionaryRepresentation();
-  EXPECT_EQ(*dictionary.find("imsi"), Value(Bytes{0x09, 0x10}));
-  EXPECT_FALSE(dictionary.contains("eplmn_list"));
-  EXPECT_FALSE(
-      KCellularActivatedBearerContexts().dictionaryRepresentation().contains("bearer_contexts"));
-}
-
-TEST(ARecord, RoundTripsEveryKindOfField) {
-  KCellularActivatedBearerContexts bearers;
-  bearers.setTimestamp(1);
-  bearers.setBearerContextCount(2);
-  auto bearer = std::make_shared<BearerContext>();
-  bearer->setApn("ims");
-  bearer->setPdpType(BearerContext::PDP_TYPE_IPv4v6);
-  bearer->setPdpAddr(Bytes{10, 0, 0, 1});
-  bearer->setIsAddrIratMobile(true);
-  bearers.addBearerContexts(bearer);
-  bearers.addBearerContexts(std::make_shared<BearerContext>());
-  const Bytes encoded = bearers.data();
-  const auto copy = KCellularActivatedBearerContexts::initWithData(&encoded);
-  ASSERT_NE(copy, nullptr);
-  EXPECT_TRUE(copy->isEqual(bearers));
-  EXPECT_EQ(copy->hash(), bearers.hash());
-  EXPECT_EQ(copy->bearerContextsAtIndex(0)->apn(), std::optional<std::string>("ims"));
-
-  KCellularGsmCsRfMeasurement rf;
-  rf.addCsTxPwr(-30);
-  rf.addCsTxPwr(33);
-  const Bytes rfEncoded = rf.data();
-  const auto rfCopy = KCellularGsmCsRfMeasurement::initWithData(&rfEncoded);
-  EXPECT_TRUE(rfCopy->isEqual(rf));
-}
-
-TEST(ARecord, ComparesByClassAndValue) {
-  EXPECT_FALSE(KCellularLteTxPower().isEqual(KCellularWcdmaTxPower()));
-  EXPECT_TRUE(KCellularLteTxPower().isEqual(KCellularLteTxPower()));
-  EXPECT_EQ(KCellularLteTxPower().hash(), 0u);
-  KCellularLteRrcState a;
-  KCellularLteRrcState b;
-  a.setState(KCellularLteRrcState::KLTE_RRC_STATE_NULL);
-  EXPECT_FALSE(a.isEqual(b)) << "a value of 0 that is present differs from one that is absent";
-  b.setState(KCellularLteRrcState::KLTE_RRC_STATE_NULL);
-  EXPECT_TRUE(a.isEqual(b));
-  EXPECT_EQ(a.hash(), b.hash());
 }
 
 TEST(ARecord, SharesOnCopyToAndCopiesOnCopyWithZone) {
@@ -291,35 +207,17 @@ TEST(ARecord, SharesOnCopyToAndCopiesOnCopyWithZone) {
   EXPECT_FALSE(deep->taiListAtIndex(0)->hasTac());
 }
 
-TEST(ARecord, MergesScalarsNestedRecordsListsAndRuns) {
-  KCellularEmmContext into;
-  into.setT3412DurS(60);
-  into.setGuti(std::make_shared<Guti>());
-  into.guti()->setMmec(1);
-  into.addTaiList(std::make_shared<KCellularTrackingAreaId>());
-
-  KCellularEmmContext from;
-  from.setRegStatus(KCellularEmmContext::KREG_STATUS_LIMITED_SERVICE);
-  from.setGuti(std::make_shared<Guti>());
-  from.guti()->setMTmsi(5);
-  from.addTaiList(std::make_shared<KCellularTrackingAreaId>());
-  into.mergeFrom(from);
-
-  EXPECT_EQ(into.t3412DurS(), 60u);
-  EXPECT_EQ(into.regStatus(), KCellularEmmContext::KREG_STATUS_LIMITED_SERVICE);
-  EXPECT_EQ(into.guti()->mmec(), 1u);
-  EXPECT_EQ(into.guti()->mTmsi(), 5u);
-  EXPECT_EQ(into.taiListsCount(), 2u);
-
+// Value-by-value equality, copies, merges and the dictionary form are held against libprotobuf
+// by the oracle tests; what follows is what it cannot see.
+TEST(ARecord, ComparesByClassTooAndThrowsForAnIndexPastItsList) {
+  EXPECT_FALSE(KCellularLteTxPower().isEqual(KCellularWcdmaTxPower()));
   KCellularWcdmaSelReselCellInfo runs;
   runs.addMultiBandInfo(1);
-  KCellularWcdmaSelReselCellInfo more;
-  more.addMultiBandInfo(2);
-  runs.mergeFrom(more);
-  EXPECT_EQ(runs.multiBandInfosCount(), 2u);
-  EXPECT_EQ(runs.multiBandInfoAtIndex(1), 2u);
-  EXPECT_THROW((void)runs.multiBandInfoAtIndex(2), std::out_of_range);
+  EXPECT_THROW((void)runs.multiBandInfoAtIndex(1), std::out_of_range);
   EXPECT_THROW((void)KCellularEmmContext().taiListAtIndex(0), std::out_of_range);
+  SecondaryComponentCarrier carrier;
+  carrier.setHasUplink(false);
+  EXPECT_TRUE(carrier.hasHasUplink());
 }
 
 TEST(ARecord, DescribesItselfByClassIdentityAndDictionary) {

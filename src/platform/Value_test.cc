@@ -27,19 +27,12 @@ TEST(AValue, TakesTheKindOfTheArgumentsOwnType) {
   EXPECT_EQ(Value(5).kind(), Kind::Int32);
   EXPECT_EQ(Value(5u).kind(), Kind::UInt32);
   EXPECT_EQ(Value(5L).kind(), Kind::Int64);
-  EXPECT_EQ(Value(5LL).kind(), Kind::Int64);
   EXPECT_EQ(Value(5ULL).kind(), Kind::UInt64);
-  EXPECT_EQ(Value(std::int16_t{5}).kind(), Kind::Int32);
   EXPECT_EQ(Value(std::uint8_t{5}).kind(), Kind::UInt32);
-  EXPECT_EQ(Value(5.0f).kind(), Kind::Float);
   EXPECT_EQ(Value(5.0).kind(), Kind::Double);
-  EXPECT_EQ(Value(std::string_view("x")).kind(), Kind::String);
   char buffer[] = "x";
   EXPECT_EQ(Value(buffer).kind(), Kind::String);
   EXPECT_EQ(Value(static_cast<char*>(buffer)).kind(), Kind::String);
-  EXPECT_EQ(Value(Bytes{1}).kind(), Kind::Bytes);
-  EXPECT_EQ(Value(List{}).kind(), Kind::List);
-  EXPECT_EQ(Value(Dictionary{}).kind(), Kind::Dictionary);
 }
 
 TEST(AValue, IsNullWhenAbsentOrMadeFromANullPointer) {
@@ -50,30 +43,24 @@ TEST(AValue, IsNullWhenAbsentOrMadeFromANullPointer) {
 
 TEST(AValue, CountsBooleansAsNumbersButNotTextOrContainers) {
   EXPECT_TRUE(Value(false).isNumber());
-  EXPECT_TRUE(Value(1.5).isNumber());
   EXPECT_FALSE(Value("1").isNumber());
   EXPECT_FALSE(Value(List{1}).isNumber());
-  EXPECT_FALSE(Value().isNumber());
 }
 
 TEST(AValue, ReadsAsAnIntegerOnlyWhenTheNumberIsExactlyOne) {
   EXPECT_EQ(Value(true).asInteger(), 1);
-  EXPECT_EQ(Value(-7).asInteger(), -7);
   EXPECT_EQ(Value(5.0).asInteger(), 5);
   EXPECT_EQ(Value(-0x1p63).asInteger(), std::numeric_limits<std::int64_t>::min());
   EXPECT_EQ(Value(std::uint64_t{1} << 63).asInteger(), std::nullopt);
   EXPECT_EQ(Value(0x1p63).asInteger(), std::nullopt);
   EXPECT_EQ(Value(5.5).asInteger(), std::nullopt);
   EXPECT_EQ(Value(std::nan("")).asInteger(), std::nullopt);
-  EXPECT_EQ(Value(INFINITY).asInteger(), std::nullopt);
   EXPECT_EQ(Value("5").asInteger(), std::nullopt);
-  EXPECT_EQ(Value().asInteger(), std::nullopt);
 }
 
 TEST(AValue, ReadsAsAnInt32OnlyWithinItsRange) {
   EXPECT_EQ(Value(std::int64_t{-2147483648}).asInt32(), -2147483647 - 1);
   EXPECT_EQ(Value(std::int64_t{2147483648}).asInt32(), std::nullopt);
-  EXPECT_EQ(Value(std::uint32_t{4294967295}).asInt32(), std::nullopt);
   EXPECT_EQ(Value(2147483647.0).asInt32(), 2147483647);
   EXPECT_EQ(Value(2147483648.0f).asInt32(), std::nullopt);
 }
@@ -83,7 +70,6 @@ TEST(AValue, ReadsAsAFloatOnlyWhenTheFloatHoldsTheValueExactly) {
   EXPECT_EQ(Value(-10.5).asFloat(), -10.5f);
   EXPECT_EQ(Value(0.1).asFloat(), std::nullopt);
   EXPECT_EQ(Value(16777217).asFloat(), std::nullopt);
-  EXPECT_EQ(Value(1e300).asFloat(), std::nullopt);
   EXPECT_EQ(Value(std::numeric_limits<std::int64_t>::max()).asFloat(), std::nullopt);
   EXPECT_EQ(Value(-INFINITY).asFloat(), -INFINITY);
   EXPECT_TRUE(std::isnan(*Value(std::nan("")).asFloat()));
@@ -94,7 +80,6 @@ TEST(AValue, ReadsAsADoubleOnlyWhenTheDoubleHoldsTheValueExactly) {
   EXPECT_EQ(Value(std::int64_t{1} << 53).asDouble(), 9007199254740992.0);
   EXPECT_EQ(Value((std::int64_t{1} << 53) + 1).asDouble(), std::nullopt);
   EXPECT_EQ(Value(std::numeric_limits<std::uint64_t>::max()).asDouble(), std::nullopt);
-  EXPECT_EQ(Value(false).asDouble(), 0.0);
 }
 
 TEST(AValue, HandsOutItsContentsOnlyForTheirOwnKind) {
@@ -102,7 +87,6 @@ TEST(AValue, HandsOutItsContentsOnlyForTheirOwnKind) {
   EXPECT_EQ(Value(1).asString(), nullptr);
   EXPECT_EQ(*Value(Bytes{1, 2}).asBytes(), (Bytes{1, 2}));
   EXPECT_EQ(Value("x").asList(), nullptr);
-  EXPECT_EQ(Value(List{}).asDictionary(), nullptr);
 
   Value list(List{1});
   list.asList()->push_back(2);
@@ -114,7 +98,6 @@ TEST(AValue, EqualsOnlyAValueOfTheSameKindAndValue) {
   EXPECT_NE(Value(1), Value(std::int64_t{1}));
   EXPECT_NE(Value(1), Value(true));
   EXPECT_NE(Value(1.0f), Value(1.0));
-  EXPECT_EQ(Value(), Value());
   EXPECT_NE(Value(), Value(""));
   EXPECT_NE(Value(List{1, 2}), Value(List{2, 1}));
 }
@@ -124,7 +107,6 @@ TEST(AValue, CompareDictionariesWhateverTheirOrder) {
   const Dictionary backward{{"b", List{Dictionary{{"z", 2}, {"x", "y"}}}}, {"a", 1}};
   EXPECT_EQ(Value(forward), Value(backward));
   EXPECT_NE(forward, (Dictionary{{"a", 1}}));
-  EXPECT_NE((Dictionary{{"a", 1}}), (Dictionary{{"b", 1}}));
   EXPECT_NE((Dictionary{{"a", 1}}), (Dictionary{{"a", 2}}));
 }
 
@@ -169,7 +151,6 @@ TEST(AValueDescription, WritesTextAloneWithoutQuotesButQuotesItInsideContainers)
 
 TEST(AValueDescription, WritesListsAndDictionariesInBracketsInTheirOwnOrder) {
   EXPECT_EQ(Value(List{1, 3, 7}).description(), "[1, 3, 7]");
-  EXPECT_EQ(Value(List{}).description(), "[]");
   EXPECT_EQ(Value(Dictionary{}).description(), "[:]");
   EXPECT_EQ(Value(Dictionary{{"b", 1}, {"a", "x"}}).description(), R"(["b": 1, "a": "x"])");
   EXPECT_EQ(Value(Dictionary{{"l", List{Dictionary{}, List{}}}, {"d", Dictionary{{"n", Value()}}}})
@@ -177,22 +158,12 @@ TEST(AValueDescription, WritesListsAndDictionariesInBracketsInTheirOwnOrder) {
             R"(["l": [[:], []], "d": ["n": (null)]])");
 }
 
-TEST(AValueDescription, WritesIntegersInDecimalAndBooleansAsDigits) {
-  EXPECT_EQ(Value(-42).description(), "-42");
-  EXPECT_EQ(Value(std::numeric_limits<std::int64_t>::min()).description(), "-9223372036854775808");
-  EXPECT_EQ(Value(std::numeric_limits<std::uint64_t>::max()).description(), "18446744073709551615");
-  EXPECT_EQ(Value(List{true, false}).description(), "[1, 0]");
-}
-
 TEST(AValueDescription, PrintsFloatsInTheirShortestFormWithAFractionalPart) {
   EXPECT_EQ(Value(5.0).description(), "5.0");
-  EXPECT_EQ(Value(-11.75).description(), "-11.75");
   EXPECT_EQ(Value(1.4f).description(), "1.4");
-  EXPECT_EQ(Value(0.1).description(), "0.1");
   EXPECT_EQ(Value(-0.0).description(), "-0.0");
   EXPECT_EQ(Value(1e20).description(), "1e+20");
   EXPECT_EQ(Value(INFINITY).description(), "inf");
-  EXPECT_EQ(Value(-INFINITY).description(), "-inf");
   EXPECT_EQ(Value(-std::nan("")).description(), "nan");
 }
 
@@ -221,6 +192,7 @@ TEST(AValueDescription, WritesTextThatIsAllEscapesAndTheLongestNumbersInFull) {
                std::numeric_limits<std::int64_t>::min(), std::numeric_limits<std::uint64_t>::max()})
           .description(),
       "[-2147483648, 4294967295, -9223372036854775808, 18446744073709551615]");
+  EXPECT_EQ(Value(List{true, false}).description(), "[1, 0]");
   EXPECT_EQ(Value(List{-std::numeric_limits<double>::min(), -std::numeric_limits<double>::max(),
                        -std::numeric_limits<double>::denorm_min(), -0.00012345678901234567,
                        123456789012345680.0, -std::numeric_limits<float>::min(),
@@ -232,7 +204,6 @@ TEST(AValueDescription, WritesTextThatIsAllEscapesAndTheLongestNumbersInFull) {
 
 TEST(AValueDescription, WritesBytesInGroupsOfFourInHexadecimal) {
   EXPECT_EQ(Value(Bytes{0x0a, 0x1b, 0x2c, 0x3d, 0x4e}).description(), "<0a1b2c3d 4e>");
-  EXPECT_EQ(Value(Bytes{0xff, 0, 0, 1}).description(), "<ff000001>");
   EXPECT_EQ(Value(Bytes{}).description(), "<>");
 }
 

@@ -1,42 +1,19 @@
 'use strict';
 
 const assert = require('node:assert/strict');
-const { after, before, test } = require('node:test');
-const { startBrowser, startNorvo, screenshot, stopCleanly } = require('./norvo.js');
+const { test } = require('node:test');
+const { norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
 
-let norvo;
-let browser;
-let address;
-
-before(async () => {
-  norvo = startNorvo();
-  address = await norvo.address;
-  browser = await startBrowser();
-});
-
-after(async () => {
-  await browser?.close();
-  if (norvo) {
-    await stopCleanly(norvo);
-  }
-});
+const suite = norvoForTheseTests();
 
 const rowTexts = (page) => page.locator('main .row .text').allTextContents();
 const title = (page) => page.locator('.bar h1').textContent();
 
-async function newPage() {
-  const page = await browser.context.newPage();
-  const problems = [];
-  page.on('pageerror', (error) => problems.push(error.message));
-  page.on('console', (message) => {
-    if (message.type() === 'error') problems.push(message.text());
-  });
-  return { page, problems };
-}
+const newPage = () => openPage(suite.browser);
 
 test('browses Device Info, LTE, UMTS and GSM from the launch screen', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/');
+  await page.goto(suite.address + '/');
   assert.equal(await title(page), 'Norvo');
   assert.deepEqual(await rowTexts(page), ['Device Info', 'LTE', 'UMTS', 'GSM']);
 
@@ -48,16 +25,16 @@ test('browses Device Info, LTE, UMTS and GSM from the launch screen', async () =
   };
   for (const [item, rows] of Object.entries(expected)) {
     await page.getByRole('link', { name: item, exact: true }).click();
-    await page.waitForURL(address + '/' + encodeURIComponent(item));
+    await page.waitForURL(suite.address + '/' + encodeURIComponent(item));
     assert.equal(await title(page), item);
     const texts = await rowTexts(page);
     if (Array.isArray(rows)) assert.deepEqual(texts, rows);
     else assert.equal(texts.length, rows);
     await page.locator('.bar .back').click();
-    await page.waitForURL(address + '/');
+    await page.waitForURL(suite.address + '/');
   }
 
-  await page.goto(address + '/Device%20Info/IMSI');
+  await page.goto(suite.address + '/Device%20Info/IMSI');
   assert.deepEqual(await page.locator('main .row').first().innerText(), 'Come back later\nCome back later');
   await screenshot(page, 'device-info-imsi');
   assert.deepEqual(problems, []);
@@ -66,10 +43,10 @@ test('browses Device Info, LTE, UMTS and GSM from the launch screen', async () =
 
 test('opens LTE and CA Status, refreshes it in place and goes back', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/');
+  await page.goto(suite.address + '/');
   await page.getByRole('link', { name: 'LTE', exact: true }).click();
   await page.getByRole('link', { name: 'CA Status', exact: true }).click();
-  await page.waitForURL(address + '/LTE/CA%20Status');
+  await page.waitForURL(suite.address + '/LTE/CA%20Status');
   assert.equal(await title(page), 'CA Status');
   await page.getByRole('heading', { name: 'Component Carrier 0' }).waitFor();
 
@@ -96,29 +73,17 @@ test('opens LTE and CA Status, refreshes it in place and goes back', async () =>
   assert.equal(await page.evaluate(() => window.scrollY), scrolled, 'the scroll position moved');
 
   await page.locator('.bar .back').click();
-  await page.waitForURL(address + '/LTE');
+  await page.waitForURL(suite.address + '/LTE');
   assert.equal(await title(page), 'LTE');
   assert.deepEqual(problems, []);
   await page.close();
-});
-
-test('shows different categories side by side in two tabs', async () => {
-  const first = await newPage();
-  const second = await newPage();
-  await first.page.goto(address + '/UMTS/Serving%20Cell%20Meas');
-  await second.page.goto(address + '/GSM/Idle%20Config');
-  assert.equal(await title(first.page), 'Serving Cell Meas');
-  assert.equal(await title(second.page), 'Idle Config');
-  await first.page.goBack().catch(() => {});
-  await first.page.close();
-  await second.page.close();
 });
 
 test('follows the dark mode of the system and fits a desktop window', async () => {
   const { page, problems } = await newPage();
   await page.emulateMedia({ colorScheme: 'dark' });
   await page.setViewportSize({ width: 1280, height: 800 });
-  await page.goto(address + '/LTE/Serving%20Cell%20Meas');
+  await page.goto(suite.address + '/LTE/Serving%20Cell%20Meas');
   const background = await page.evaluate(() => getComputedStyle(document.body).backgroundColor);
   assert.equal(background, 'rgb(0, 0, 0)');
   const width = await page.evaluate(() => document.querySelector('main').getBoundingClientRect().width);
@@ -130,10 +95,10 @@ test('follows the dark mode of the system and fits a desktop window', async () =
 
 test('answers an unknown address with a page that leads home', async () => {
   const { page } = await newPage();
-  const response = await page.goto(address + '/LTE/No%20Such%20Thing');
+  const response = await page.goto(suite.address + '/LTE/No%20Such%20Thing');
   assert.equal(response.status(), 404);
   assert.equal(await title(page), 'Not Found');
   await page.locator('.bar .back').click();
-  await page.waitForURL(address + '/');
+  await page.waitForURL(suite.address + '/');
   await page.close();
 });

@@ -1,35 +1,12 @@
 'use strict';
 
 const assert = require('node:assert/strict');
-const { after, before, test } = require('node:test');
-const { startBrowser, startNorvo, screenshot, stopCleanly } = require('./norvo.js');
+const { test } = require('node:test');
+const { norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
 
-let norvo;
-let browser;
-let address;
+const suite = norvoForTheseTests();
 
-before(async () => {
-  norvo = startNorvo();
-  address = await norvo.address;
-  browser = await startBrowser();
-});
-
-after(async () => {
-  await browser?.close();
-  if (norvo) {
-    await stopCleanly(norvo);
-  }
-});
-
-async function newPage() {
-  const page = await browser.context.newPage();
-  const problems = [];
-  page.on('pageerror', (error) => problems.push(error.message));
-  page.on('console', (message) => {
-    if (message.type() === 'error') problems.push(message.text());
-  });
-  return { page, problems };
-}
+const newPage = () => openPage(suite.browser);
 
 // The card's rows as label to value.
 const cardRows = (page) =>
@@ -42,20 +19,20 @@ const cardRows = (page) =>
 
 test('opens from the launch screen, whose rows stay as they are', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/');
+  await page.goto(suite.address + '/');
   assert.deepEqual(await page.locator('main .row .text').allTextContents(), ['Device Info', 'LTE', 'UMTS', 'GSM']);
   await page.locator('.bar .links').getByRole('link', { name: 'Dashboard' }).click();
-  await page.waitForURL(address + '/dashboard');
+  await page.waitForURL(suite.address + '/dashboard');
   assert.equal(await page.locator('.bar h1').textContent(), 'Dashboard');
   await page.locator('.bar .back').click();
-  await page.waitForURL(address + '/');
+  await page.waitForURL(suite.address + '/');
   assert.deepEqual(problems, []);
   await page.close();
 });
 
 test('fills the card and the graphs from the simulated phone', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/dashboard');
+  await page.goto(suite.address + '/dashboard');
   await page.waitForFunction(
     () => [...document.querySelectorAll('#cell dt')].some((term) => term.textContent === 'Downlink'),
     null,
@@ -94,7 +71,7 @@ test('fills the card and the graphs from the simulated phone', async () => {
 test('keeps a graph\'s zoom across a refresh', async () => {
   const { page, problems } = await newPage();
   await page.setViewportSize({ width: 1280, height: 900 });
-  await page.goto(address + '/dashboard');
+  await page.goto(suite.address + '/dashboard');
   await page.waitForFunction(
     () => Number(document.querySelector('.graph[data-graph="level"]')?.dataset.points) >= 3,
     null,
@@ -125,34 +102,5 @@ test('keeps a graph\'s zoom across a refresh', async () => {
   await page.waitForFunction(() => !location.hash.includes('from='));
   await screenshot(page, 'dashboard-desktop');
   assert.deepEqual(problems, []);
-  await page.close();
-});
-
-test('follows the dark mode of the system', async () => {
-  const { page, problems } = await newPage();
-  await page.emulateMedia({ colorScheme: 'dark' });
-  await page.goto(address + '/dashboard');
-  const background = await page.evaluate(() => getComputedStyle(document.body).backgroundColor);
-  assert.equal(background, 'rgb(0, 0, 0)');
-  assert.deepEqual(problems, []);
-  await page.close();
-});
-
-test('answers the series a chart reads, and refuses a since in the future', async () => {
-  const { page } = await newPage();
-  await page.goto(address + '/dashboard');
-  const answers = await page.evaluate(async () => {
-    const listing = await (await fetch('/api/series')).json();
-    const future = await fetch(`/api/series?name=lte.rsrp&since=${listing.now + 60000}`);
-    const malformed = await fetch('/api/series?name=lte.rsrp&since=yesterday');
-    return {
-      names: listing.series.map((series) => series.name),
-      future: [future.status, (await future.json()).detail],
-      malformed: malformed.status,
-    };
-  });
-  assert.ok(answers.names.includes('lte.rsrp'));
-  assert.deepEqual(answers.future, [400, 'since is in the future']);
-  assert.equal(answers.malformed, 400);
   await page.close();
 });

@@ -9,7 +9,7 @@ const net = require('node:net');
 const os = require('node:os');
 const path = require('node:path');
 const { after, before, test } = require('node:test');
-const { startBrowser, startProgram, screenshot, program } = require('./norvo.js');
+const { freePort, startBrowser, startProgram, screenshot, program } = require('./norvo.js');
 
 const fleetSim = process.env.NORVO_FLEET_SIM ??
     path.join(path.dirname(program), '..', '..', 'tools', 'fleetsim', 'norvo-fleet-sim');
@@ -21,17 +21,6 @@ let devices;
 let fleet;
 let browser;
 let address;
-
-function freePort() {
-  return new Promise((resolve, reject) => {
-    const server = net.createServer();
-    server.once('error', reject);
-    server.listen(0, '127.0.0.1', () => {
-      const { port } = server.address();
-      server.close(() => resolve(port));
-    });
-  });
-}
 
 async function waitForPort(port) {
   for (let attempt = 0; attempt < 100; ++attempt) {

@@ -7,6 +7,7 @@ const fs = require('node:fs');
 const net = require('node:net');
 const os = require('node:os');
 const path = require('node:path');
+const { after, before } = require('node:test');
 const { chromium } = require('playwright-core');
 
 const repository = path.resolve(__dirname, '..', '..');
@@ -124,9 +125,46 @@ async function startBrowser() {
   };
 }
 
+// A new page of `browser` whose script errors and console errors collect in `problems`.
+async function openPage(browser) {
+  const page = await browser.context.newPage();
+  const problems = [];
+  page.on('pageerror', (error) => problems.push(error.message));
+  page.on('console', (message) => {
+    if (message.type() === 'error') problems.push(message.text());
+  });
+  return { page, problems };
+}
+
+// A Norvo with `args` and a browser for the tests of one file, stopped cleanly after them; the
+// answer holds `address` and `browser` once the tests run.
+function norvoForTheseTests(args = []) {
+  const suite = {};
+  before(async () => {
+    suite.norvo = startNorvo(args);
+    suite.address = await suite.norvo.address;
+    suite.browser = await startBrowser();
+  });
+  after(async () => {
+    await suite.browser?.close();
+    if (suite.norvo) await stopCleanly(suite.norvo);
+  });
+  return suite;
+}
+
 async function screenshot(page, name) {
   fs.mkdirSync(artifacts, { recursive: true });
   await page.screenshot({ path: path.join(artifacts, `${name}.png`) });
 }
 
-module.exports = { program, freePort, startNorvo, startProgram, stopCleanly, startBrowser, screenshot };
+module.exports = {
+  program,
+  freePort,
+  startNorvo,
+  startProgram,
+  stopCleanly,
+  startBrowser,
+  openPage,
+  norvoForTheseTests,
+  screenshot,
+};

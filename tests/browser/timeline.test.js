@@ -8,7 +8,7 @@ const fs = require('node:fs');
 const os = require('node:os');
 const path = require('node:path');
 const { after, before, test } = require('node:test');
-const { program, freePort, startBrowser, startNorvo, screenshot, stopCleanly } = require('./norvo.js');
+const { program, freePort, startBrowser, startNorvo, openPage, screenshot, stopCleanly } = require('./norvo.js');
 
 let folder;
 let norvo;
@@ -39,15 +39,7 @@ after(async () => {
   if (folder) fs.rmSync(folder, { recursive: true, force: true });
 });
 
-async function newPage() {
-  const page = await browser.context.newPage();
-  const problems = [];
-  page.on('pageerror', (error) => problems.push(error.message));
-  page.on('console', (message) => {
-    if (message.type() === 'error') problems.push(message.text());
-  });
-  return { page, problems };
-}
+const newPage = () => openPage(browser);
 
 async function replayState(page) {
   return page.evaluate(async () => (await fetch('/api/replay')).json());

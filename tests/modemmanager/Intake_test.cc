@@ -96,9 +96,6 @@ TEST_F(ModemManagerIntakeTest, ShowsAnLteModemsValuesAsModemManagerReportedThem)
 
   const Shown shown[] = {
       {"serving PCI", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "phy_cell_id"); }, 416},
-      {"serving EARFCN", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "dl_freq"); }, 1300},
-      {"serving cell ID", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "cell_id"); },
-       0xD30156},
       {"TAC", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "tracking_area_code"); },
        0x84CD},
       {"MCC", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "sel_plmn_mcc"); }, 210},
@@ -107,23 +104,16 @@ TEST_F(ModemManagerIntakeTest, ShowsAnLteModemsValuesAsModemManagerReportedThem)
       {"RSRQ", inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "rsrq0"), -11},
       {"SINR", inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "sinr0"),
        12.5},
-      {"sample PCI",
-       inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "phy_cell_id"), 416},
       {"neighbour RSRP",
        inList([](auto& s) -> const List& { return s.myLTE().EutraNbrsMeas; }, "nbr_rsrp"), -105},
       {"neighbour RSRQ",
        inList([](auto& s) -> const List& { return s.myLTE().EutraNbrsMeas; }, "nbr_rsrq"), -14.5},
-      {"neighbour PCI",
-       inList([](auto& s) -> const List& { return s.myLTE().EutraNbrsMeas; }, "nbr_phys_cell_id"),
-       17},
       {"UMTS neighbour RSCP",
        inList([](auto& s) -> const List& { return s.myLTE().UtraNbrsMeas; }, "rscp"), -90},
       {"UMTS neighbour Ec/Io",
        inList([](auto& s) -> const List& { return s.myLTE().UtraNbrsMeas; }, "ecno"), -7.5},
       {"GSM neighbour RxLev",
        inList([](auto& s) -> const List& { return s.myLTE().GeraNbrsMeas; }, "rxlev"), -80},
-      {"GSM neighbour BSIC",
-       inList([](auto& s) -> const List& { return s.myLTE().GeraNbrsMeas; }, "bsic"), 42},
   };
   for (const Shown& value : shown)
     EXPECT_EQ(value.read(validator), value.expected) << value.what;
@@ -179,30 +169,21 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
 
   const Shown shown[] = {
       {"UMTS PSC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "psc"); }, 300},
-      {"UMTS neighbour band",
-       inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "band"), 1},
       {"UMTS UARFCN", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "dl_uarfcn"); }, 10700},
-      {"UMTS LAC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "lac"); }, 0x1F},
       {"UMTS MNC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "mnc"); }, 410},
-      {"UMTS MNC digits",
-       [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "num_mnc_digits"); }, 3},
       // A WCDMA receive measurement is shown as the baseband reports it: as indexes.
       {"RSCP index", inList([](auto& s) -> const List& { return s.myUMTS().rXInfo; }, "rsrp_range"),
        -85 + 116},
       {"Ec/No index",
        inList([](auto& s) -> const List& { return s.myUMTS().rXInfo; }, "rsrq_range"),
        (-6 + 24.5) * 2},
-      {"UMTS RSSI", inList([](auto& s) -> const List& { return s.myUMTS().rXInfo; }, "rssi"), -60},
       {"UMTS neighbour RSCP",
        inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "rscp"), -101},
       {"UMTS neighbour Ec/Io",
        inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "ecno"), -12.5},
       {"LTE neighbour RSRP from UMTS",
        inList([](auto& s) -> const List& { return s.myUMTS().eUtraNbrMeas; }, "rsrp"), -110},
-      {"LTE neighbour RSRQ from UMTS",
-       inList([](auto& s) -> const List& { return s.myUMTS().eUtraNbrMeas; }, "rsrq"), -16},
       {"GSM ARFCN", [](auto& s) { return numberIn(s.myGSMScellInfoDict(), "arfcn"); }, 62},
-      {"GSM BSIC", [](auto& s) { return numberIn(s.myGSMScellInfoDict(), "bsic"); }, 42},
       {"GSM RxLev", [](auto& s) { return numberIn(s.myGSMIdleScellMeasDict(), "idle_rxlev_dBm"); },
        33 - 110},
       {"GSM neighbour RxLev",
@@ -213,8 +194,6 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
        inList([](auto& s) -> const List& { return s.myGSM().utraNbrMeas; }, "cpich_ecn0"), -21.5},
       {"LTE neighbour RSRP from GSM",
        inList([](auto& s) -> const List& { return s.myGSM().eUtraNbrMeas; }, "rsrp"), -120},
-      {"LTE neighbour RSRQ from GSM",
-       inList([](auto& s) -> const List& { return s.myGSM().eUtraNbrMeas; }, "rsrq"), -18.5},
   };
   for (const Shown& value : shown)
     EXPECT_EQ(value.read(validator), value.expected) << value.what;

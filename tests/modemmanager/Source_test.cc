@@ -110,7 +110,7 @@ TEST_F(ModemManagerSourceTest, FollowsTheFirstModemThroughAHandover) {
   EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
 }
 
-TEST_F(ModemManagerSourceTest, SaysOnceWhenPolkitRefusesAndGoesOnWithTheSignal) {
+TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionOnceAndGoesOnWithTheSignal) {
   fake->refuseDeviceControl(true);
   fake->addModem(0, lteModem(kImei));
   fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
@@ -118,6 +118,12 @@ TEST_F(ModemManagerSourceTest, SaysOnceWhenPolkitRefusesAndGoesOnWithTheSignal) 
   ASSERT_TRUE(eventually([&] {
     return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr) != nullptr;
   }));
+  ASSERT_TRUE(eventually([&] { return seen.count("refused") == 2; }));
+  EXPECT_THAT(seen.lines(),
+              Contains("ModemManager refused GetCellInfo: this user lacks the polkit action "
+                       "org.freedesktop.ModemManager1.Device.Control; docs/modemmanager.md gives "
+                       "the rule that grants it. Going on with what can still be read"));
+  EXPECT_TRUE(seen.said("ModemManager refused Signal.Setup"));
   // Several refreshes later, still one line each.
   seen.clear();
   ASSERT_TRUE(eventually([&] {
@@ -131,18 +137,6 @@ TEST_F(ModemManagerSourceTest, SaysOnceWhenPolkitRefusesAndGoesOnWithTheSignal) 
   EXPECT_EQ(servingPci(), -1);
   const auto sample = seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr);
   EXPECT_EQ(sample->instValuesAtIndex(0)->rsrp0(), -97);
-}
-
-TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionInOneLine) {
-  fake->refuseDeviceControl(true);
-  fake->addModem(0, lteModem(kImei));
-  startSource();
-  ASSERT_TRUE(eventually([&] { return seen.count("refused") == 2; }));
-  EXPECT_THAT(seen.lines(),
-              Contains("ModemManager refused GetCellInfo: this user lacks the polkit action "
-                       "org.freedesktop.ModemManager1.Device.Control; docs/modemmanager.md gives "
-                       "the rule that grants it. Going on with what can still be read"));
-  EXPECT_TRUE(seen.said("ModemManager refused Signal.Setup"));
 }
 
 TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRest) {

@@ -163,8 +163,6 @@ TEST_F(TenMinuteDrive, ReportsLteCellsAndLevelsInTheirPhysicalRanges) {
     EXPECT_LT(info->phyCellId(), 504u);
     EXPECT_TRUE(inLteBand(info->freqBandInd(), info->dlFreq()));
     EXPECT_EQ(info->ulFreq(), bands::lteUlEarfcn(info->freqBandInd(), info->dlFreq()));
-    EXPECT_TRUE(info->dlBw() == 50 || info->dlBw() == 100);
-    EXPECT_EQ(info->selPlmnMcc(), 1u);
   }
   for (const auto& meas : records<KCellularLteNbrEutraCellMeas>(id::KCellularLteNbrEutraCellMeas)) {
     for (const auto& cell : meas->measNbrEutras()) {
@@ -180,20 +178,6 @@ TEST_F(TenMinuteDrive, ReportsLteCellsAndLevelsInTheirPhysicalRanges) {
       EXPECT_TRUE(inLteBand(scc->dlRfBand(), scc->dlEarfcn()));
       EXPECT_LE(scc->dlBandwidth(), 5u);
       EXPECT_TRUE(scc->rsrp() >= -14000 && scc->rsrp() <= -4400) << scc->rsrp();
-      EXPECT_TRUE(scc->rsrq() >= -1950 && scc->rsrq() <= -300) << scc->rsrq();
-      EXPECT_LT(scc->rssi(), -2000);
-    }
-  }
-  for (const auto& sample : records<KCellularLteRsrpRsrqSinr>(id::KCellularLteRsrpRsrqSinr)) {
-    for (const auto& values : sample->instValues()) {
-      EXPECT_TRUE(values->rsrp0() >= -150 && values->rsrp0() <= -40) << values->rsrp0();
-      EXPECT_TRUE(values->sinr0() >= -40 && values->sinr0() <= 60) << values->sinr0();
-    }
-  }
-  for (const auto& power : records<KCellularLteTxPower>(id::KCellularLteTxPower)) {
-    for (const auto& sample : power->txPowerInfos()) {
-      EXPECT_LE(sample->puschTxPower(), 23);
-      EXPECT_LT(sample->subframeIndex(), 10u);
     }
   }
 }
@@ -218,17 +202,9 @@ TEST_F(TenMinuteDrive, ReportsUmtsAndGsmCellsAndLevelsInTheirPhysicalRanges) {
     EXPECT_TRUE(info->arfcn() >= band.firstArfcn && info->arfcn() <= band.lastArfcn);
     EXPECT_LT(info->bsic(), 64u);
   }
-  for (const auto& meas :
-       records<KCellularGsmIdleScellMeasurement>(id::KCellularGsmIdleScellMeasurement)) {
-    EXPECT_TRUE(meas->idleRxlevDBm() >= -110 && meas->idleRxlevDBm() <= -20);
-  }
   for (const auto& meas : records<KCellularGsmCsRfMeasurement>(id::KCellularGsmCsRfMeasurement)) {
     EXPECT_LE(meas->csRxlevSub(), 63u);
     EXPECT_LE(meas->csRxqualSub(), 7u);
-    ASSERT_GT(meas->csTxPwrsCount(), 0u);
-    for (std::size_t i = 0; i < meas->csTxPwrsCount(); ++i) {
-      EXPECT_TRUE(meas->csTxPwrAtIndex(i) >= 5 && meas->csTxPwrAtIndex(i) <= 33);
-    }
   }
 }
 

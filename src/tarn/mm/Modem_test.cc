@@ -1,8 +1,17 @@
-#include "tarn/mm/Reading.h"
-
 #include <ModemManager.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+
+#include <cmath>
+#include <limits>
+
+#include "messages/Metrics.h"
+#include "messages/Records.h"
+#include "tarn/mm/Names.h"
+#include "tarn/mm/Reader.h"
+#include "tarn/mm/Reading.h"
+#include "tarn/mm/Selection.h"
+#include "tarn/mm/SimFiles.h"
 
 namespace tarn::mm {
 namespace {
@@ -138,6 +147,117 @@ TEST(ReadingTheRegistration, LeavesWhatModemManagerCallsUnknownAbsent) {
   EXPECT_FALSE(unknown.epsUeMode);
   EXPECT_FALSE(unknown.packetService);
   EXPECT_THAT(problems, IsEmpty());
+}
+
+TEST(AReader, AnswersWellFormedValuesAndDropsTheRestWithOneLineEach) {
+  const Dict dict = {
+      {"rsrp", d(-97.5)},
+      {"nan", d(std::nan(""))},
+      {"infinite", d(std::numeric_limits<double>::infinity())},
+      {"low", d(-200)},
+      {"string", s("-90")},
+      {"earfcn", u(6300)},
+      {"big", u(1u << 20)},
+      {"pci", s("1A0")},
+      {"notHex", s("1G")},
+      {"empty", s("")},
+      {"hexTooBig", s("200")},
+      {"broken", {"d", std::monostate{}}},
+  };
+  Problems problems;
+  const Reader reader(dict, "Signal.Lte", problems);
+  EXPECT_EQ(reader.real("rsrp", -156, -31), -97.5);
+  EXPECT_EQ(reader.real("missing", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.unsignedInt("earfcn", 262143), 6300u);
+  EXPECT_EQ(reader.hex("pci", 503), 0x1A0u);
+  EXPECT_THAT(problems, IsEmpty());
+
+  EXPECT_EQ(reader.real("nan", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.real("infinite", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.real("low", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.real("string", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.unsignedInt("big", 262143), std::nullopt);
+  EXPECT_EQ(reader.hex("notHex", 503), std::nullopt);
+  EXPECT_EQ(reader.text("empty"), std::nullopt);
+  EXPECT_EQ(reader.hex("hexTooBig", 0xFF), std::nullopt);
+  EXPECT_EQ(reader.real("broken", -156, -31), std::nullopt);
+  EXPECT_EQ(reader.dictionary("rsrp"), nullptr);
+  EXPECT_THAT(problems, ElementsAre("Signal.Lte \"nan\": not a number; dropped",
+                                    "Signal.Lte \"infinite\": not a number; dropped",
+                                    "Signal.Lte \"low\": -200 is outside -156 to -31; dropped",
+                                    "Signal.Lte \"string\": wanted d, got s; dropped",
+                                    "Signal.Lte \"big\": 1048576 is above 262143; dropped",
+                                    "Signal.Lte \"notHex\": \"1G\" is not hexadecimal; dropped",
+                                    "Signal.Lte \"hexTooBig\": 200 is above FF; dropped",
+                                    "Signal.Lte \"rsrp\": wanted a{sv}, got d; dropped"));
+}
+
+std::map<std::string, Dict, std::less<>> modem(std::string imei) {
+  return {
+      {std::string(kModemInterface), Dict{{"EquipmentIdentifier", Value{"s", std::move(imei)}}}}};
+}
+
+TEST(ChoosingAModem, PicksByPathIndexOrImeiAndTheLowestIndexWithoutASelector) {
+  const Objects objects = {
+      {"/org/freedesktop/ModemManager1/Modem/12", modem("356938035643809")},
+      {"/org/freedesktop/ModemManager1/Modem/3", modem("490154203237518")},
+      {"/org/freedesktop/ModemManager1/SIM/3", {{std::string(kSimInterface), Dict{}}}},
+  };
+  const struct {
+    std::string_view selector;
+    std::optional<std::string> chosen;
+  } cases[] = {
+      {"", "/org/freedesktop/ModemManager1/Modem/3"},
+      {"12", "/org/freedesktop/ModemManager1/Modem/12"},
+      {"/org/freedesktop/ModemManager1/Modem/12", "/org/freedesktop/ModemManager1/Modem/12"},
+      {"356938035643809", "/org/freedesktop/ModemManager1/Modem/12"},
+      {"4", std::nullopt},
+      {"/org/freedesktop/ModemManager1/SIM/3", std::nullopt},
+  };
+  for (const auto& test : cases)
+    EXPECT_EQ(chooseModem(objects, test.selector), test.chosen) << test.selector;
+  EXPECT_EQ(chooseModem({}, ""), std::nullopt);
+  EXPECT_EQ(modemIndex("/org/freedesktop/ModemManager1/Modem/12"), "12");
+}
+
+TEST(EfSpn, HoldsTheNameInTheGsmAlphabetPaddedWithFf) {
+  const platform::Bytes expected = {0x00, 'N',  'o',  'r',  'v',  'o',  ' ',  '1', 0xFF,
+                                    0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF};
+  EXPECT_EQ(encodeEfSpn("Norvo 1"), expected);
+  EXPECT_EQ(encodeEfSpn("ABCDEFGHIJKLMNOP")->size(), 17u);
+  EXPECT_EQ(encodeEfSpn("ABCDEFGHIJKLMNOPQ"), std::nullopt);
+  EXPECT_EQ(encodeEfSpn("a_b"), std::nullopt);
+  EXPECT_EQ(encodeEfSpn("caf\xC3\xA9"), std::nullopt);
+  EXPECT_EQ(simFilesMetric(Sim{}, 0), std::nullopt);
+}
+
+TEST(SimFiles, HoldTheIdentitiesInTheFilesEncodingsAsAPhoneReadsThem) {
+  const Sim sim{.iccid = "8931041010654378930",
+                .imsi = "310410123456789",
+                .operatorId = "310410",
+                .serviceProvider = "Norvo"};
+  const std::optional<service::Metric> metric = simFilesMetric(sim, 1500000000000);
+  ASSERT_TRUE(metric);
+  EXPECT_EQ(metric->metricId, messages::metric::KCellularSimCardFiles);
+  const auto files = messages::KCellularSimCardFiles::initWithData(&metric->payload);
+  ASSERT_TRUE(files);
+  ASSERT_EQ(files->efListsCount(), 3u);
+  EXPECT_EQ(files->efListAtIndex(0)->efId(), 0x2FE2u);
+  EXPECT_EQ(files->efListAtIndex(0)->content(),
+            (platform::Bytes{0x98, 0x13, 0x40, 0x01, 0x01, 0x56, 0x34, 0x87, 0x39, 0xF0}));
+  EXPECT_EQ(files->efListAtIndex(1)->efId(), 0x6F07u);
+  EXPECT_EQ(files->efListAtIndex(1)->content(),
+            (platform::Bytes{0x08, 0x39, 0x01, 0x14, 0x10, 0x32, 0x54, 0x76, 0x98}));
+  EXPECT_EQ(files->efListAtIndex(2)->efId(), 0x6F46u);
+
+  const std::optional<service::Metric> common = mmCommonInfoMetric(sim, 1500000000000);
+  ASSERT_TRUE(common);
+  EXPECT_EQ(messages::KCellularMmCommonInfo::initWithData(&common->payload)->imsi(),
+            files->efListAtIndex(1)->content());
+  // An identity that does not encode is left out, not made up.
+  const auto broken = simFilesMetric(
+      Sim{.iccid = "12", .imsi = "31041O", .operatorId = {}, .serviceProvider = {}}, 0);
+  EXPECT_EQ(broken, std::nullopt);
 }
 
 }  // namespace

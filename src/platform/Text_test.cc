@@ -1,5 +1,3 @@
-#include "platform/DateFormat.h"
-
 #include <gtest/gtest.h>
 #include <unicode/locid.h>
 #include <unicode/smpdtfmt.h>
@@ -9,6 +7,9 @@
 #include <cstdlib>
 #include <limits>
 #include <string>
+
+#include "platform/Base64.h"
+#include "platform/DateFormat.h"
 
 namespace platform {
 namespace {
@@ -113,6 +114,36 @@ TEST_F(DateFormatTest, ReusesItsWorkWithoutChangingAnyText) {
   }
   UErrorCode status = U_ZERO_ERROR;
   icu::Locale::setDefault(saved, status);
+}
+
+Bytes bytesOf(std::string_view text) {
+  return Bytes(text.begin(), text.end());
+}
+
+TEST(Base64, EncodesTheRfcExamplesWithPadding) {
+  EXPECT_EQ(base64Encode(bytesOf("")), "");
+  EXPECT_EQ(base64Encode(bytesOf("f")), "Zg==");
+  EXPECT_EQ(base64Encode(bytesOf("fo")), "Zm8=");
+  EXPECT_EQ(base64Encode(bytesOf("foo")), "Zm9v");
+  EXPECT_EQ(base64Encode(Bytes{0xFB, 0xFF, 0xBF}), "+/+/");
+}
+
+TEST(Base64, DecodesWhatItEncodesForEveryByteValueAndLength) {
+  Bytes bytes;
+  for (int i = 0; i < 256; ++i) {
+    bytes.push_back(static_cast<std::uint8_t>(255 - i));
+    EXPECT_EQ(base64Decode(base64Encode(bytes)), bytes) << "length " << bytes.size();
+  }
+}
+
+TEST(Base64, RefusesTextThatIsNotStandardBase64) {
+  EXPECT_FALSE(base64Decode("Zg="));       // length not a multiple of four
+  EXPECT_FALSE(base64Decode("Zg"));        // padding left out
+  EXPECT_FALSE(base64Decode("Z=g="));      // padding inside
+  EXPECT_FALSE(base64Decode("Zm9v\n"));    // whitespace
+  EXPECT_FALSE(base64Decode("-_8A"));      // the URL-safe alphabet
+  EXPECT_FALSE(base64Decode("Zg==Zg=="));  // padding before the end
+  EXPECT_EQ(base64Decode(""), Bytes{});
 }
 
 }  // namespace

@@ -6,15 +6,23 @@
 
 #include "Broker.h"
 #include "Eventually.h"
+#include "RecordingSession.h"
+#include "Records.h"
 #include "Subscriber.h"
 #include "TemporaryFolder.h"
+#include "platform/Base64.h"
 #include "platform/Log.h"
+#include "tarn/mqtt/MqttTransport.h"
 #include "tarn/mqtt/Publisher.h"
+#include "tarn/mqtt/PublishingSource.h"
+#include "tarn/testing/ScriptedMetricSource.h"
 
 namespace {
 
 using namespace std::chrono_literals;
 using bustest::eventually;
+using bustest::integerAt;
+using bustest::RecordingSession;
 using bustest::TemporaryFolder;
 using mqtttest::Broker;
 using mqtttest::Subscriber;
@@ -206,6 +214,154 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   }
   EXPECT_EQ(subscriber.payloadsOn(kMetrics).size(), 1u);
   EXPECT_THAT(log.systemLines(), ::testing::Contains(HasSubstr("certificate verify failed")));
+}
+
+constexpr std::uint32_t kRrcState = 0x3C4E04;
+constexpr std::uint32_t kCaStatus = 0x3CD313;
+constexpr std::uint32_t kSimFiles = 0x3C0013;
+
+tarn::service::Metric metric(std::uint32_t metricId, std::uint8_t mark) {
+  return {metricId, platform::Bytes{0x08, mark}};
+}
+
+TEST(AMetricMessage, IsReadOrRefusedWithTheReason) {
+  const std::string hugeButValid = R"({"kKeyMetricID":3952132,"kKeyPayload":")" +
+                                   platform::base64Encode(platform::Bytes(8 << 20, 1)) + R"("})";
+  const struct {
+    std::string message;
+    std::string error;
+  } cases[] = {
+      {R"({"kKeyMetricID":3952132,"kKeyPayload":"CAM=","t_ms":5,"device":"x","unix_ms":1})", ""},
+      {R"({"kKeyMetricID":3952132,"kKeyPayload":"CAM=")", "not JSON (incomplete JSON)"},
+      {R"([3952132,"CAM="])", "not a JSON object"},
+      {R"({"kKeyMetricID":3952132,"kKeyPayload":"C@M="})",
+       "\"kKeyPayload\" is not standard base64 text"},
+      {R"({"kKeyMetricID":1193046,"kKeyPayload":"CAM="})", "unknown metric ID 1193046"},
+      {R"({"kKeyMetricID":"0x3C4E04","kKeyPayload":"CAM="})", "no integer \"kKeyMetricID\""},
+      {R"({"kKeyMetricID":3952132})", "no \"kKeyPayload\""},
+      {hugeButValid, "too large (" + std::to_string(hugeButValid.size()) + " bytes)"},
+  };
+  for (const auto& [message, error] : cases) {
+    const tarn::mqtt::ReadMetric read = tarn::mqtt::readMetricMessage(message);
+    EXPECT_EQ(read.error, error) << message.substr(0, 80);
+    if (error.empty()) {
+      ASSERT_TRUE(read.metric);
+      EXPECT_EQ(read.metric->metricId, kRrcState);
+      EXPECT_EQ(read.metric->payload, (platform::Bytes{0x08, 0x03}));
+    }
+  }
+}
+
+// The viewer's session reaches the device through the broker as if its service ran here.
+TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
+  TemporaryFolder folder;
+  Broker broker(folder.path(), {});
+  const auto address = [&](const std::string& path) {
+    return *tarn::mqtt::parseBrokerAddress(broker.address(path)).address;
+  };
+  platform::log::Capture log;
+  auto transport = std::make_shared<tarn::mqtt::MqttTransport>(
+      tarn::mqtt::RemoteDevice{address("fleet/car-3"), std::nullopt, "norvo"});
+  RecordingSession session(*transport);
+  ASSERT_EQ(session.configure("0x3C4E04\n0x3CD313\n"), tarn::CommandResult{});
+
+  auto publisher = std::make_unique<tarn::mqtt::Publisher>(
+      tarn::mqtt::PublisherOptions{.broker = address("fleet"),
+                                   .caFile = std::nullopt,
+                                   .device = "car-3",
+                                   .qos = 1,
+                                   .queueLimit = 100,
+                                   .source = "sim, seed 3",
+                                   .name = "tarnd"});
+  ASSERT_TRUE(eventually([&] { return transport->device().status().status == "online"; }));
+
+  // Messages that do not read, among good ones, from a client that is no tarnd.
+  tarn::mqtt::LinkOptions rogueOptions;
+  rogueOptions.broker = address("fleet");
+  rogueOptions.name = "rogue";
+  tarn::mqtt::Link rogue(rogueOptions, {});
+  rogue.start();
+  const auto line = [](std::uint32_t metricId, std::uint8_t mark) {
+    return tarn::mqtt::metricMessage(metric(metricId, mark), 0, "car-3", 1);
+  };
+  const std::string topic = "fleet/car-3/metrics";
+  const std::vector<std::string> messages = {
+      line(kRrcState, 1),
+      "{\"kKeyMetricID\": 3952132, oops",
+      line(kSimFiles, 2),
+      R"({"kKeyMetricID":3952132,"kKeyPayload":"not base64!"})",
+      line(0x3C4F6A, 3),  // not subscribed
+      R"({"kKeyMetricID":4660,"kKeyPayload":"CAM="})",
+      std::string(10 << 20, '{'),
+      line(kCaStatus, 4),
+  };
+  for (const std::string& message : messages) {
+    ASSERT_TRUE(eventually([&] { return rogue.publish(topic, message, 1, false).has_value(); }));
+  }
+  ASSERT_TRUE(eventually([&] { return transport->device().refused() == 4; }));
+  const auto metricIds = [&] { return bustest::metricIdsOf(session.received()); };
+  ASSERT_TRUE(eventually([&] { return metricIds().size() >= 2; }));
+  EXPECT_EQ(metricIds(), (std::vector<std::int64_t>{kRrcState, kCaStatus}));
+  for (const std::string_view reason : {"not JSON", "is not standard base64",
+                                        "unknown metric ID 4660", "too large (10485760 bytes)"})
+    EXPECT_THAT(log.plainLines(), ::testing::Contains(HasSubstr(reason)));
+
+  // A query is answered with the last metric of its kind that the device published.
+  const tarn::CommandResult query = session.perform(
+      tarn::kCommandQueryMetric, bustest::withAppId({bustest::entry(
+                                     tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+  EXPECT_EQ(query, tarn::CommandResult{});
+  ASSERT_TRUE(eventually([&] { return metricIds().size() >= 3; }));
+  EXPECT_EQ(metricIds().back(), kSimFiles);
+
+  // The device goes: the session keeps what it has, and the status says so.
+  publisher.reset();
+  ASSERT_TRUE(eventually([&] { return transport->device().status().status == "offline"; }));
+  EXPECT_EQ(log.count("norvo: fleet/car-3 is offline (source: sim, seed 3)"), 1u);
+}
+
+// The SIM files come once, at power-on: a viewer that comes later has them from the broker.
+TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
+  TemporaryFolder folder;
+  Broker broker(folder.path(), {});
+  const auto address = [&](const std::string& path) {
+    return *tarn::mqtt::parseBrokerAddress(broker.address(path)).address;
+  };
+  tarn::mqtt::Publisher publisher({.broker = address("fleet"),
+                                   .caFile = std::nullopt,
+                                   .device = "car-4",
+                                   .qos = 1,
+                                   .queueLimit = 100,
+                                   .source = "scripted",
+                                   .name = "tarnd"});
+  auto scripted = std::make_shared<tarn::testing::ScriptedMetricSource>();
+  tarn::mqtt::PublishingSource source(scripted, publisher, "fleet", "car-4");
+  source.start([](const tarn::service::Metric&) {});
+  scripted->emit(metric(kSimFiles, 1));
+  scripted->emit(metric(kRrcState, 2));
+  scripted->emit(metric(kSimFiles, 3));  // the newer one counts
+  scripted->flush();
+  ASSERT_TRUE(eventually([&] { return publisher.counts().sent == 3; }));
+
+  platform::log::Capture log;
+  tarn::mqtt::MqttTransport transport(
+      tarn::mqtt::RemoteDevice{address("fleet/car-4"), std::nullopt, "norvo"});
+  {
+    RecordingSession session(transport);
+    ASSERT_EQ(session.configure("0x3C4E04\n"), tarn::CommandResult{});
+    const auto query = [&] {
+      return session.perform(tarn::kCommandQueryMetric,
+                             bustest::withAppId({bustest::entry(
+                                 tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+    };
+    ASSERT_TRUE(eventually([&] { return query() == tarn::CommandResult{}; }));
+    const std::vector<bustest::ReceivedEvent> events = session.waitFor(2);
+    ASSERT_GE(events.size(), 2u);
+    const tarn::ipc::Object& answer = events[1].record;
+    EXPECT_EQ(integerAt(answer, tarn::kKeyMetricID), kSimFiles);
+    EXPECT_EQ(*answer.find(tarn::kKeyPayload)->asBytes(), (platform::Bytes{0x08, 3}));
+  }
+  source.stop();
 }
 
 }  // namespace

@@ -1,15 +1,22 @@
-#include "tarn/service/Core.h"
-
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <condition_variable>
+#include <fstream>
 #include <future>
+#include <iterator>
+#include <string>
 
 #include "platform/Log.h"
+#include "tarn/Ipc.h"
 #include "tarn/Names.h"
 #include "tarn/client/Client.h"
 #include "tarn/client/Transport.h"
+#include "tarn/flow/DropTally.h"
+#include "tarn/flow/KindQueue.h"
+#include "tarn/service/Configuration.h"
+#include "tarn/service/Core.h"
 #include "tarn/testing/ScriptedMetricSource.h"
 #include "tarn/transport/InProcess.h"
 
@@ -24,8 +31,11 @@ namespace {
 using namespace std::chrono_literals;
 using namespace tarn;
 using platform::Dictionary;
+using platform::List;
 using platform::Value;
 using tarn::ipc::Object;
+using tarn::service::Configuration;
+using tarn::service::ConfigurationError;
 
 constexpr std::uint32_t kRrcState = 0x3C4E04;
 constexpr std::uint32_t kCaStatus = 0x3CD313;
@@ -268,4 +278,156 @@ TEST(AClientSession, AnswersWithAStatusWhenItsHandleIsEmptyOrItsServiceHasGone) 
   client::EventsOn(manager);
 }
 
+TEST(AnIpcObject, BecomesAPlainDictionaryWithItsEntriesInOrderAndNestedValuesConverted) {
+  Object record;
+  record.set("kKeyMetricID", Object::integer(-1));
+  record.set("kKeyPayload", Object::bytes({0x0A, 0xFF}));
+  record.set("note", Object::text("rrc"));
+  record.set("none", Object());
+  record.set("cells", Object::array(
+                          {Object::integer(3), Object::dictionary({{"pci", Object::integer(7)}})}));
+  record.set("kKeyMetricID", Object::integer(0x3C4E04));
+
+  const Value plain = tarn::ipc::toPlainDictionary(record);
+
+  EXPECT_EQ(plain, Value(Dictionary{
+                       {"kKeyMetricID", std::int64_t{0x3C4E04}},
+                       {"kKeyPayload", platform::Bytes{0x0A, 0xFF}},
+                       {"note", "rrc"},
+                       {"none", nullptr},
+                       {"cells", List{std::int64_t{3}, Dictionary{{"pci", std::int64_t{7}}}}}}));
+  ASSERT_TRUE(plain.isDictionary());
+  EXPECT_EQ(plain.asDictionary()->begin()->first, "kKeyMetricID");
+}
+
+TEST(AnIpcObject, IsNullForAByteBufferLargerThanAMessageCarries) {
+  EXPECT_TRUE(Object::bytes(platform::Bytes(Object::kMaxBufferSize + 1)).isNull());
+  EXPECT_FALSE(Object::bytes({}).isNull());
+}
+
+std::string errorOf(std::string_view text) {
+  try {
+    Configuration::parse(text);
+  } catch (const ConfigurationError& error) {
+    return error.what();
+  }
+  return "(accepted)";
+}
+
+TEST(AConfiguration, ReadsOneHexMetricIdPerLineUnderTheProfileDeclaredAboveIt) {
+  const Configuration configuration = Configuration::parse(
+      "\xEF\xBB\xBF# field test\r\n"
+      "0x3C4E04   # LTE RRC state\r\n"
+      "\r\n"
+      "\t0X3cd313\n"
+      "profile 12\n"
+      "0x3C0013");
+
+  EXPECT_EQ(configuration.size(), 3u);
+  EXPECT_EQ(configuration.profileOf(0x3C4E04), 0);
+  EXPECT_EQ(configuration.profileOf(0x3CD313), 0);
+  EXPECT_EQ(configuration.profileOf(0x3C0013), 12);
+  EXPECT_EQ(configuration.profileOf(0x3CD30E), std::nullopt);
+}
+
+TEST(AConfiguration, NamesTheLineAndTheFaultOfAMalformedText) {
+  const std::pair<std::string_view, std::string_view> cases[] = {
+      {"", "the configuration is empty"},
+      {"# nothing\n\n", "the configuration subscribes to no metric"},
+      {"0x3C4E04\n3C4E04\n",
+       "line 2: '3C4E04' is not a metric ID; write metric IDs in hex, like 0x3C4E04"},
+      {"0x", "line 1: '0x' is not a metric ID; write metric IDs in hex, like 0x3C4E04"},
+      {"0x3C4G04", "line 1: '0x3C4G04' is not a metric ID; write metric IDs in hex, like 0x3C4E04"},
+      {"\x01\x02", "line 1: '\?\?' is not a metric ID; write metric IDs in hex, like 0x3C4E04"},
+      {"0x0", "line 1: metric ID 0x0 is out of range (0x1 to 0xFFFFFFFF)"},
+      {"0x100000000", "line 1: metric ID 0x100000000 is out of range (0x1 to 0xFFFFFFFF)"},
+      {"0x3C4E04 0x3CD313",
+       "line 1: unexpected '0x3CD313' after the metric ID; write one metric per line"},
+      {"0x3C4E04\n# again\n0x3c4e04", "line 3: metric ID 0x3C4E04 is already subscribed on line 1"},
+      {"profile\n0x1", "line 1: 'profile' takes one number from 0 to 2147483647"},
+      {"profile -1\n0x1", "line 1: 'profile' takes one number from 0 to 2147483647"},
+      {"profile 2147483648\n0x1", "line 1: 'profile' takes one number from 0 to 2147483647"},
+      {"profile 1 2\n0x1", "line 1: 'profile' takes one number from 0 to 2147483647"},
+  };
+  for (const auto& [text, error] : cases)
+    EXPECT_EQ(errorOf(text), error) << text;
+
+  const std::string largest(Configuration::kLargestText, '#');
+  EXPECT_EQ(errorOf(largest), "the configuration subscribes to no metric");
+  EXPECT_EQ(errorOf(largest + "\n0x1"),
+            "the configuration is 1048580 bytes long; it may be at most 1048576");
+}
+
+TEST(TheShippedConfiguration, SubscribesToEveryMetricThatTheIntakeKnows) {
+  std::ifstream file(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig", std::ios::binary);
+  const std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  const Configuration configuration = Configuration::parse(text);
+
+  const std::uint32_t intakeMetrics[] = {
+      0x3C4E18, 0x3C4E04, 0x3C40C2, 0x3C4E25, 0x3CD30E, 0x3CD301, 0x3CD302, 0x3C4F6A,
+      0x3CD30B, 0x3CD313, 0x3CD310, 0x3CD30F, 0x3CD317, 0x3CD509, 0x3CD50D, 0x3CD50C,
+      0x3CD50A, 0x3CD50B, 0x3CD112, 0x3CD113, 0x3C300C, 0x3CD102, 0x3CD103, 0x3CD104,
+      0x3CD105, 0x3C2E0C, 0x3CD001, 0x3CD002, 0x3CD003, 0x3CD009, 0x3CD00C, 0x3C0013};
+  EXPECT_EQ(configuration.size(), std::size(intakeMetrics));
+  for (const std::uint32_t metricId : intakeMetrics) {
+    EXPECT_TRUE(configuration.profileOf(metricId)) << std::hex << metricId;
+  }
+}
+
 }  // namespace
+
+namespace tarn::flow {
+namespace {
+
+using namespace std::chrono_literals;
+
+TEST(AKindQueue, WhenFullDropsTheOldestOfTheKindWithTheMostWaitingAndKeepsTheOrder) {
+  KindQueue<int> queue(4);
+  // Kind 1 comes often, kind 2 once: the rare one stays however many of the frequent one come.
+  EXPECT_EQ(queue.push(1, 10), std::nullopt);
+  EXPECT_EQ(queue.push(2, 20), std::nullopt);
+  EXPECT_EQ(queue.push(1, 11), std::nullopt);
+  EXPECT_EQ(queue.push(1, 12), std::nullopt);
+  EXPECT_EQ(queue.push(1, 13), 1u);
+  EXPECT_EQ(queue.push(3, 30), 1u);
+  EXPECT_EQ(queue.size(), 4u);
+  EXPECT_EQ(queue.takeAll(), (std::vector<int>{20, 12, 13, 30}));
+  EXPECT_EQ(queue.size(), 0u);
+  EXPECT_EQ(queue.push(1, 14), std::nullopt);
+  EXPECT_EQ(queue.takeAll(), (std::vector<int>{14}));
+}
+
+TEST(AKindQueue, StaysWithinItsCapacityUnderAFlood) {
+  KindQueue<std::uint64_t> queue(100);
+  std::size_t dropped = 0;
+  for (std::uint64_t i = 0; i < 100'000; ++i) {
+    if (queue.push(i % 7, i)) ++dropped;
+    ASSERT_LE(queue.size(), 100u);
+  }
+  EXPECT_EQ(dropped, 100'000u - 100u);
+  // The newest of each kind survives.
+  const std::vector<std::uint64_t> kept = queue.takeAll();
+  for (std::uint64_t newest = 100'000 - 7; newest < 100'000; ++newest) {
+    EXPECT_NE(std::find(kept.begin(), kept.end(), newest), kept.end()) << newest;
+  }
+}
+
+TEST(ADropTally, ReportsTheDropsByKindAtMostOnceASecond) {
+  DropTally tally("tarnd");
+  const auto start = DropTally::Clock::time_point() + 1h;
+  EXPECT_EQ(tally.report(start), std::nullopt);
+  tally.count(0x3C4E04);
+  tally.count(0x3C4E04);
+  tally.count(0);
+  EXPECT_EQ(tally.report(start),
+            "tarnd: fell behind; dropped 3 event(s), the oldest of their kind: events \u00D71, "
+            "0x3C4E04 \u00D72");
+  tally.count(0x3CD313);
+  EXPECT_EQ(tally.report(start + 999ms), std::nullopt);
+  EXPECT_EQ(tally.report(start + 1s),
+            "tarnd: fell behind; dropped 1 event(s), the oldest of their kind: 0x3CD313 \u00D71");
+  EXPECT_EQ(tally.report(start + 5s), std::nullopt);
+}
+
+}  // namespace
+}  // namespace tarn::flow

@@ -12,6 +12,7 @@
 #include "app/ServiceOption.h"
 #include "platform/CommandLine.h"
 #include "platform/Json.h"
+#include "platform/Log.h"
 #include "platform/MainQueue.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
@@ -103,6 +104,7 @@ int runIntakeCommand(std::span<const std::string_view> arguments) {
   store::MetricValidator& intake = store::MetricValidator::sharedInstance();
   const bool read = deliverMetricLog(log, logName, intake, std::cerr);
   // The log lines are the command's output: a disk that is full or a pipe that closed loses them.
+  platform::log::drain();
   if (std::fflush(stdout) != 0 || std::ferror(stdout) != 0) {
     std::cerr << "norvo intake: cannot write the log lines to standard output: "
               << std::strerror(errno) << '\n';

@@ -1,5 +1,7 @@
 #include "store/MetricValidator.h"
 
+#include <algorithm>
+#include <charconv>
 #include <memory>
 
 #include "client/TarnWrapper.h"
@@ -14,6 +16,24 @@ namespace store {
 namespace {
 
 constexpr std::string_view kTimestampPattern = "yyyy-MM-dd HH:mm:ss zzz";
+
+// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its 64 bits, at least
+// two wide), without the general formatter: the line is written for every metric.
+std::string metricIDLine(std::int64_t metricID) {
+  constexpr std::string_view kPrefix = "Metric ID in Hex = ";
+  char digits[16];
+  char* const last =
+      std::to_chars(digits, digits + sizeof digits, static_cast<std::uint64_t>(metricID), 16).ptr;
+  std::transform(digits, last, digits,
+                 [](char c) { return c >= 'a' ? static_cast<char>(c - 'a' + 'A') : c; });
+  const auto length = static_cast<std::size_t>(last - digits);
+  std::string line;
+  line.reserve(kPrefix.size() + std::max<std::size_t>(length, 2));
+  line.append(kPrefix);
+  if (length < 2) line.push_back(' ');
+  line.append(digits, length);
+  return line;
+}
 
 }  // namespace
 
@@ -52,7 +72,7 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     platform::log::plain("The metric record has no integer \"kKeyMetricID\"; nothing to do");
     return false;
   }
-  platform::log::plainf("Metric ID in Hex = %2X", *metricID_);
+  platform::log::plain(metricIDLine(*metricID_));
 
   const Handler* handler = handlerFor(*metricID_);
   if (handler == nullptr) {

@@ -109,7 +109,7 @@ class MetricValidator : public TarnWrapperDelegate {
     return store_[DisplayDictionary::name];                                \
   }                                                                        \
   void setMy##name##Dict(std::optional<platform::Dictionary> dictionary) { \
-    store_[DisplayDictionary::name] = std::move(dictionary);               \
+    store_.replace(DisplayDictionary::name, std::move(dictionary));        \
   }
   NORVO_DISPLAY_DICTIONARIES(NORVO_DISPLAY_ACCESSORS)
 #undef NORVO_DISPLAY_ACCESSORS

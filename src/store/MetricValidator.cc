@@ -1,10 +1,10 @@
 #include "store/MetricValidator.h"
 
 #include <algorithm>
+#include <atomic>
 #include <charconv>
 #include <memory>
 
-#include "client/TarnWrapper.h"
 #include "platform/DateFormat.h"
 #include "platform/Format.h"
 #include "platform/Log.h"
@@ -17,8 +17,11 @@ namespace {
 
 constexpr std::string_view kTimestampPattern = "yyyy-MM-dd HH:mm:ss zzz";
 
-// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its 64 bits, at least
-// two wide), without the general formatter: the line is written for every metric.
+std::atomic<MetricSession*> sharedSession{nullptr};
+
+// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its
+// 64 bits, at least two wide), without the general formatter: the line is
+// written for every metric.
 std::string metricIDLine(std::int64_t metricID) {
   constexpr std::string_view kPrefix = "Metric ID in Hex = ";
   char digits[16];
@@ -37,19 +40,23 @@ std::string metricIDLine(std::int64_t metricID) {
 
 }  // namespace
 
+void MetricValidator::setSharedSession(MetricSession* session) {
+  sharedSession = session;
+}
+
 MetricValidator& MetricValidator::sharedInstance() {
   // Never released; the session holds it weakly as its delegate.
   static const std::shared_ptr<MetricValidator>* const shared = [] {
-    TarnWrapper& session = TarnWrapper::sharedInstance();
+    MetricSession* session = sharedSession.load();
     auto* validator =
-        new std::shared_ptr<MetricValidator>(std::make_shared<MetricValidator>(&session));
-    session.setDelegate(*validator);
+        new std::shared_ptr<MetricValidator>(std::make_shared<MetricValidator>(session));
+    if (session != nullptr) session->setDelegate(*validator);
     return validator;
   }();
   return **shared;
 }
 
-MetricValidator::MetricValidator(TarnWrapper* session) : mySharedTarnInstance_(session) {
+MetricValidator::MetricValidator(MetricSession* session) : mySharedTarnInstance_(session) {
   if (mySharedTarnInstance_ != nullptr) mySharedTarnInstance_->listen();
 }
 

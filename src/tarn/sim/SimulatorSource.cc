@@ -4,6 +4,7 @@
 #include <chrono>
 #include <cmath>
 #include <stdexcept>
+#include <utility>
 #include <vector>
 
 #include "messages/Metrics.h"
@@ -11,8 +12,6 @@
 
 namespace tarn::sim {
 namespace {
-
-using Clock = std::chrono::steady_clock;
 
 // How often the worker wakes to deliver what has come due, in wall-clock time.
 constexpr auto kTick = std::chrono::milliseconds(20);
@@ -37,8 +36,11 @@ double checkedSpeed(double speed) {
 }  // namespace
 
 SimulatorSource::SimulatorSource(std::uint64_t seed, double speed,
-                                 std::optional<std::uint64_t> startEpochMs)
-    : speed_(checkedSpeed(speed)), simulator_(seed, startEpochMs.value_or(systemNowMs())) {}
+                                 std::optional<std::uint64_t> startEpochMs,
+                                 std::shared_ptr<service::SourceClock> clock)
+    : speed_(checkedSpeed(speed)),
+      clock_(std::move(clock)),
+      simulator_(seed, startEpochMs.value_or(systemNowMs())) {}
 
 SimulatorSource::~SimulatorSource() {
   stop();
@@ -68,13 +70,12 @@ std::optional<service::Metric> SimulatorSource::query(std::uint32_t metricId) {
 
 void SimulatorSource::run(std::stop_token stop,
                           const std::function<void(service::Metric)>& deliver) {
-  const Clock::time_point began = Clock::now();
+  const service::SourceClock::TimePoint began = clock_->now();
   double simulatedMs = 0.0;  // simulated time advanced since `began`
   std::unique_lock lock(mutex_);
   bool behind = false;  // more is due than the last slice covered: go on without waiting
-  while (!(behind ? stop.stop_requested()
-                  : wake_.wait_for(lock, stop, kTick, [&stop] { return stop.stop_requested(); }))) {
-    const double wallMs = std::chrono::duration<double, std::milli>(Clock::now() - began).count();
+  while (!(behind ? stop.stop_requested() : clock_->waitUntil(lock, stop, clock_->now() + kTick))) {
+    const double wallMs = std::chrono::duration<double, std::milli>(clock_->now() - began).count();
     const double dueMs = std::floor(wallMs * speed_ - simulatedMs);
     behind = dueMs > kSliceMs;
     if (dueMs < 1.0) continue;

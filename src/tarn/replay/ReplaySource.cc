@@ -91,7 +91,10 @@ void ReplaySource::run(std::stop_token stop, const std::function<void(service::M
   const service::SourceClock::TimePoint began = clock_->now();
   // Log time at which the current pass began: each loop carries on from the last metric.
   std::int64_t passMs = 0;
-  std::unique_lock lock(mutex_);
+  // The clock waits with a lock held; this one is the worker's alone, so that stop() never
+  // waits for a worker that delivers without pause.
+  std::mutex waiting;
+  std::unique_lock lock(waiting);
   do {
     for (const Timed& timed : metrics_) {
       if (options_.speed) {
@@ -103,9 +106,7 @@ void ReplaySource::run(std::stop_token stop, const std::function<void(service::M
       } else if (stop.stop_requested()) {
         return;
       }
-      lock.unlock();
       deliver(timed.metric);
-      lock.lock();
     }
     passMs += metrics_.back().deliveryMs;
   } while (options_.loop);

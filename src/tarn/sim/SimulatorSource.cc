@@ -15,9 +15,9 @@ namespace {
 
 // How often the worker wakes to deliver what has come due, in wall-clock time.
 constexpr auto kTick = std::chrono::milliseconds(20);
-// The most simulated time one step computes while it holds the lock: a few dozen metrics, so
-// that query() and stop() never wait long, whatever the speed.
-constexpr double kSliceMs = 10'000.0;
+// The most simulated time one step computes while it holds the lock: a few metrics, so that
+// query() and stop() never wait long, whatever the speed.
+constexpr double kSliceMs = 1'000.0;
 
 std::uint64_t systemNowMs() {
   return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::milliseconds>(
@@ -47,7 +47,7 @@ SimulatorSource::~SimulatorSource() {
 }
 
 void SimulatorSource::start(std::function<void(service::Metric)> deliver) {
-  std::lock_guard lock(mutex_);
+  std::lock_guard lock(workerMutex_);
   if (worker_.joinable()) return;
   worker_ = std::jthread(
       [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
@@ -56,7 +56,7 @@ void SimulatorSource::start(std::function<void(service::Metric)> deliver) {
 void SimulatorSource::stop() {
   std::jthread worker;
   {
-    std::lock_guard lock(mutex_);
+    std::lock_guard lock(workerMutex_);
     worker = std::move(worker_);
   }
   // Leaving this scope asks the worker to stop and joins it.
@@ -64,7 +64,9 @@ void SimulatorSource::stop() {
 
 std::optional<service::Metric> SimulatorSource::query(std::uint32_t metricId) {
   if (metricId != messages::metric::KCellularSimCardFiles) return std::nullopt;
+  ++queriesWaiting_;
   std::lock_guard lock(mutex_);
+  --queriesWaiting_;
   return simulator_.simFiles();
 }
 
@@ -87,6 +89,9 @@ void SimulatorSource::run(std::stop_token stop,
       if (stop.stop_requested()) break;
       deliver(std::move(timed.metric));
     }
+    // A worker that is behind would take the lock straight back, ahead of a waiting query.
+    while (queriesWaiting_.load() > 0)
+      std::this_thread::yield();
     lock.lock();
   }
 }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -46,7 +47,10 @@ class SimulatorSource final : public service::MetricSource {
 
   const double speed_;
   const std::shared_ptr<service::SourceClock> clock_;
-  std::mutex mutex_;  // guards the simulator and the worker
+  std::mutex mutex_;  // guards the simulator
+  // How many query() calls wait for mutex_: the worker lets them in before its next slice.
+  std::atomic<int> queriesWaiting_{0};
+  std::mutex workerMutex_;  // guards worker_
   Simulator simulator_;
   std::jthread worker_;
 };

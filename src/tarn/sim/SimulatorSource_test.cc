@@ -57,7 +57,7 @@ void runFor(testing::ManualClock& clock, std::chrono::milliseconds wall) {
 }
 
 TEST(ASimulatorSource, RunsSimulatedTimeAtItsSpeedAndStopsDeliveringWhenStopped) {
-  // At the fastest speed a tick is 200 s of simulated time, delivered in slices of 10 s.
+  // At the fastest speed a tick is 200 s of simulated time, delivered in slices of 1 s.
   for (const double speed : {40.0, SimulatorSource::kFastest}) {
     const auto clock = std::make_shared<testing::ManualClock>();
     SimulatorSource source(2, speed, kStartMs, clock);

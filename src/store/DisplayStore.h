@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <atomic>
 #include <memory>
 #include <optional>
 
@@ -46,8 +47,12 @@ struct DisplayStore {
 
 // The stored dictionary, ready to be changed: copied first when anyone else holds it.
 inline platform::Dictionary& mutableDictionary(StoredDictionary& stored) {
-  if (stored.use_count() > 1)
+  if (stored.use_count() > 1) {
     stored = std::make_shared<std::optional<platform::Dictionary>>(*stored);
+  } else {
+    // The last other holder let go after reading it: its reads come before our writes.
+    std::atomic_thread_fence(std::memory_order_acquire);
+  }
   return **stored;
 }
 

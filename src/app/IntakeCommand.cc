@@ -10,8 +10,10 @@
 #include <string>
 
 #include "app/ServiceOption.h"
+#include "app/SharedIntake.h"
 #include "platform/CommandLine.h"
 #include "platform/Json.h"
+#include "platform/Log.h"
 #include "platform/MainQueue.h"
 #include "store/MetricValidator.h"
 #include "store/StoreDump.h"
@@ -100,9 +102,10 @@ int runIntakeCommand(std::span<const std::string_view> arguments) {
 
   // Only the log's records may reach the store: the service in this process has no source.
   useService(ServiceChoice{}, nullptr);
-  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
+  store::MetricValidator& intake = sharedIntake();
   const bool read = deliverMetricLog(log, logName, intake, std::cerr);
   // The log lines are the command's output: a disk that is full or a pipe that closed loses them.
+  platform::log::drain();
   if (std::fflush(stdout) != 0 || std::ferror(stdout) != 0) {
     std::cerr << "norvo intake: cannot write the log lines to standard output: "
               << std::strerror(errno) << '\n';

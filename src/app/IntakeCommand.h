@@ -5,7 +5,7 @@
 #include <span>
 #include <string_view>
 
-#include "client/TarnWrapperDelegate.h"
+#include "tarn/client/TarnWrapperDelegate.h"
 
 namespace app {
 

@@ -1,11 +1,11 @@
 #include "app/RootNavigationController.h"
 
+#include "app/SharedIntake.h"
 #include "platform/Log.h"
 
 RootNavigationController::RootNavigationController(std::unique_ptr<ui::ViewController> root)
-    : RootNavigationController(std::move(root), &TarnWrapper::sharedInstance(),
-                               store::MetricValidator::sharedInstance(), ui::Bundle::mainBundle()) {
-}
+    : RootNavigationController(std::move(root), &TarnWrapper::sharedInstance(), app::sharedIntake(),
+                               ui::Bundle::mainBundle()) {}
 
 RootNavigationController::RootNavigationController(std::unique_ptr<ui::ViewController> root,
                                                    TarnWrapper* tarnWrapper,
@@ -29,7 +29,7 @@ void RootNavigationController::viewDidLoad() {
   platform::log::plain("pushing metric file");
   if (myTarnWrapper_ == nullptr || !myTarnWrapper_->addVelaConfigForAppId(myAppID_, *path)) return;
 
-  if (TarnWrapper* session = myMetricValidator_.mySharedTarnInstance()) session->listen();
+  if (store::MetricSession* session = myMetricValidator_.mySharedTarnInstance()) session->listen();
   platform::log::plain("Querying SIM files");
   // Always the service's name for this app, whatever myAppID holds.
   if (myTarnWrapper_ != nullptr)

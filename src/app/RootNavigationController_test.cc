@@ -6,6 +6,7 @@
 #include <map>
 
 #include "app/AppDelegate.h"
+#include "app/SharedIntake.h"
 #include "platform/Log.h"
 #include "screens/NorvoViewController.h"
 #include "tarn/Ipc.h"
@@ -70,7 +71,8 @@ class TheRootNavigationController : public ::testing::Test {
 
   std::shared_ptr<RecordingTransport> transport = std::make_shared<RecordingTransport>();
   TarnWrapper session{*transport};
-  store::MetricValidator validator{&session};
+  app::TarnWrapperSession intakeSession{session};
+  store::MetricValidator validator{&intakeSession};
   const ui::Bundle shipped{{NORVO_RESOURCES_DIR}};
   const ui::Bundle empty{{std::filesystem::temp_directory_path() / "norvo-no-resources"}};
 };

@@ -16,6 +16,7 @@
 #include "app/RecordClock.h"
 #include "app/ReplayControls.h"
 #include "app/ServiceOption.h"
+#include "app/SharedIntake.h"
 #include "app/ViewerAlerts.h"
 #include "app/ViewerEvents.h"
 #include "app/ViewerOutput.h"
@@ -281,7 +282,7 @@ int runViewer(std::span<const std::string_view> arguments) {
     return 1;
   }
 
-  store::MetricValidator& intake = store::MetricValidator::sharedInstance();
+  store::MetricValidator& intake = sharedIntake();
   RecordClock recordTime(intake);
   series::SeriesStore levels([&recordTime] { return recordTime.nowMs(); });
   const std::unique_ptr<ViewerOutput> output =

@@ -10,6 +10,7 @@
 #include "app/IntakeCommand.h"
 #include "app/RecordCommand.h"
 #include "app/Viewer.h"
+#include "platform/Log.h"
 
 namespace {
 
@@ -45,6 +46,8 @@ constexpr std::string_view kCommandsUsage =
 }  // namespace
 
 int main(int argc, char** argv) {
+  // Log lines are made and written off the main queue; returning from here writes out the rest.
+  const platform::log::WriterThread logWriter;
   const std::vector<std::string_view> arguments(argv + 1, argv + argc);
   const std::string_view name = arguments.empty() ? "" : arguments.front();
   if (name == "--help" || name == "-h" || name == "help") {

@@ -5,9 +5,16 @@
 
 #include <algorithm>
 #include <atomic>
+#include <chrono>
 #include <climits>
+#include <condition_variable>
+#include <cstdint>
 #include <cstdio>
+#include <cstdlib>
 #include <mutex>
+#include <stdexcept>
+#include <thread>
+#include <utility>
 
 namespace platform::log {
 
@@ -16,6 +23,19 @@ namespace {
 bool isTerminal(std::FILE* output) {
   return isatty(fileno(output)) == 1;
 }
+
+enum class Channel : std::uint8_t { Plain, System, Warning };
+
+// One line on its way out.
+struct Line {
+  Channel channel = Channel::Plain;
+  std::string text;
+  // A described line is `prefix` followed by the text form of `described`, made when written.
+  std::string_view prefix;
+  std::shared_ptr<const Dictionary> described;
+};
+
+}  // namespace
 
 struct Channels {
   std::mutex mutex;
@@ -31,26 +51,181 @@ struct Channels {
     static Channels* const channels = new Channels;
     return *channels;
   }
+
+  void write(Channel channel, std::string_view line) {
+    const std::lock_guard lock(mutex);
+    if (!captures.empty()) {
+      Capture& capture = *captures.back();
+      (channel == Channel::Plain ? capture.plainLines_ : capture.systemLines_).emplace_back(line);
+      return;
+    }
+    switch (channel) {
+      case Channel::Plain:
+        writeToPlainOutput(line);
+        break;
+      case Channel::Warning:
+        writeToStandardError(line);
+        writeToSystemLog(line);
+        break;
+      case Channel::System:
+        writeToSystemLog(line);
+        break;
+    }
+  }
+
+  void write(Line& line) {
+    if (line.described) {
+      line.text.assign(line.prefix);
+      appendDescription(line.text, *line.described);
+    }
+    write(line.channel, line.text);
+  }
+
+ private:
+  void writeToPlainOutput(std::string_view line) {
+    // Holding the stream keeps the line whole even next to other writers of the same stream.
+    flockfile(plainOutput);
+    std::fwrite(line.data(), 1, line.size(), plainOutput);
+    std::fputc('\n', plainOutput);
+    if (plainInteractive) std::fflush(plainOutput);
+    funlockfile(plainOutput);
+    plainUnflushed = !plainInteractive;
+  }
+
+  static void writeToStandardError(std::string_view line) {
+    std::string whole(line);
+    whole += '\n';
+    // Unbuffered, so that the line is out even if the process is about to end.
+    std::fwrite(whole.data(), 1, whole.size(), stderr);
+  }
+
+  void writeToSystemLog(std::string_view line) {
+    if (!systemLogOpen) {
+      openlog("norvo", LOG_PID, LOG_USER);
+      systemLogOpen = true;
+    }
+    const int length = static_cast<int>(std::min<std::size_t>(line.size(), INT_MAX));
+    syslog(LOG_NOTICE, "%.*s", length, line.data());
+  }
 };
 
-void writeToPlainOutput(Channels& channels, std::string_view line) {
-  std::FILE* output = channels.plainOutput;
-  // Holding the stream keeps the line whole even next to other writers of the same stream.
-  flockfile(output);
-  std::fwrite(line.data(), 1, line.size(), output);
-  std::fputc('\n', output);
-  if (channels.plainInteractive) std::fflush(output);
-  funlockfile(output);
-  channels.plainUnflushed = !channels.plainInteractive;
+namespace {
+
+// The lines waiting for the WriterThread. The writer takes all that wait at once, so at most
+// twice the capacity is held: those waiting and those being written.
+class LineQueue {
+ public:
+  static LineQueue& instance() {
+    static LineQueue* const queue = new LineQueue;  // never destroyed, like Channels
+    return *queue;
+  }
+
+  void start(std::size_t capacity) {
+    const std::lock_guard lock(mutex_);
+    if (running_) throw std::logic_error("one log WriterThread at a time");
+    capacity_ = std::max<std::size_t>(capacity, 1);
+    running_ = true;
+    stopping_ = false;
+    writer_ = std::thread([this] { writeUntilStopped(); });
+  }
+
+  // Writes out what is queued and ends the writer.
+  void stop() {
+    std::thread writer;
+    {
+      const std::lock_guard lock(mutex_);
+      stopping_ = true;
+      writer = std::move(writer_);
+    }
+    lineQueued_.notify_one();
+    writer.join();
+  }
+
+  // False, having queued nothing, when no writer runs: the caller writes the line itself.
+  bool push(Line&& line) {
+    std::unique_lock lock(mutex_);
+    if (!running_) return false;
+    roomMade_.wait(lock, [this] { return waiting_.size() < capacity_ || !running_; });
+    if (!running_) return false;
+    waiting_.push_back(std::move(line));
+    ++queued_;
+    const bool wake = writerWaiting_ && (waiting_.size() == 1 || waiting_.size() == hurryAt());
+    lock.unlock();
+    if (wake) lineQueued_.notify_one();
+    return true;
+  }
+
+  void drain() {
+    std::unique_lock lock(mutex_);
+    const std::uint64_t target = queued_;
+    if (written_ >= target || !running_) return;
+    ++draining_;
+    lock.unlock();
+    lineQueued_.notify_one();
+    lock.lock();
+    linesWritten_.wait(lock, [this, target] { return written_ >= target || !running_; });
+    --draining_;
+  }
+
+ private:
+  void writeUntilStopped() {
+    Channels& channels = Channels::instance();
+    std::vector<Line> batch;
+    std::unique_lock lock(mutex_);
+    for (;;) {
+      writerWaiting_ = true;
+      lineQueued_.wait(lock, [this] { return !waiting_.empty() || stopping_; });
+      // Waking for every line would cost the writers more than the lines themselves: the first
+      // line waits a little for others to join it, unless the queue fills or someone waits.
+      lineQueued_.wait_for(lock, kGathering, [this] {
+        return waiting_.size() >= hurryAt() || stopping_ || draining_ > 0;
+      });
+      writerWaiting_ = false;
+      if (waiting_.empty()) break;
+      batch.swap(waiting_);
+      lock.unlock();
+      roomMade_.notify_all();
+      for (Line& line : batch)
+        channels.write(line);
+      const std::size_t count = batch.size();
+      batch.clear();
+      lock.lock();
+      written_ += count;
+      linesWritten_.notify_all();
+    }
+    running_ = false;
+    roomMade_.notify_all();
+    linesWritten_.notify_all();
+  }
+
+  std::size_t hurryAt() const { return (capacity_ + 1) / 2; }
+
+  static constexpr auto kGathering = std::chrono::milliseconds(10);
+
+  std::mutex mutex_;
+  std::condition_variable lineQueued_;
+  std::condition_variable roomMade_;
+  std::condition_variable linesWritten_;
+  std::vector<Line> waiting_;
+  std::size_t capacity_ = 1;
+  std::uint64_t queued_ = 0;
+  std::uint64_t written_ = 0;
+  bool running_ = false;
+  bool stopping_ = false;
+  bool writerWaiting_ = false;
+  int draining_ = 0;
+  std::thread writer_;
+};
+
+void emit(Line&& line) {
+  if (!LineQueue::instance().push(std::move(line))) Channels::instance().write(line);
 }
 
-void writeToSystemLog(Channels& channels, std::string_view line) {
-  if (!channels.systemLogOpen) {
-    openlog("norvo", LOG_PID, LOG_USER);
-    channels.systemLogOpen = true;
-  }
-  const int length = static_cast<int>(std::min<std::size_t>(line.size(), INT_MAX));
-  syslog(LOG_NOTICE, "%.*s", length, line.data());
+void emit(Channel channel, std::string_view text) {
+  Line line;
+  line.channel = channel;
+  line.text = text;
+  emit(std::move(line));
 }
 
 std::atomic<int> silences{0};
@@ -70,28 +245,30 @@ bool silenced() {
 }
 
 void plain(std::string_view line) {
-  if (silenced()) return;
-  Channels& channels = Channels::instance();
-  const std::lock_guard lock(channels.mutex);
-  if (channels.captures.empty()) {
-    writeToPlainOutput(channels, line);
-  } else {
-    channels.captures.back()->plainLines_.emplace_back(line);
-  }
+  if (!silenced()) emit(Channel::Plain, line);
 }
 
 void system(std::string_view line) {
+  if (!silenced()) emit(Channel::System, line);
+}
+
+void warning(std::string_view line) {
   if (silenced()) return;
-  Channels& channels = Channels::instance();
-  const std::lock_guard lock(channels.mutex);
-  if (channels.captures.empty()) {
-    writeToSystemLog(channels, line);
-  } else {
-    channels.captures.back()->systemLines_.emplace_back(line);
-  }
+  drain();
+  Channels::instance().write(Channel::Warning, line);
+}
+
+void plainDescribed(std::string_view prefix, std::shared_ptr<const Dictionary> described) {
+  if (silenced()) return;
+  Line line;
+  line.channel = Channel::Plain;
+  line.prefix = prefix;
+  line.described = std::move(described);
+  emit(std::move(line));
 }
 
 void setPlainOutput(std::FILE* output) {
+  drain();
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (channels.plainUnflushed) std::fflush(channels.plainOutput);
@@ -101,6 +278,7 @@ void setPlainOutput(std::FILE* output) {
 }
 
 void flushPlain() {
+  drain();
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   if (!channels.plainUnflushed) return;
@@ -108,44 +286,49 @@ void flushPlain() {
   channels.plainUnflushed = false;
 }
 
-void warning(std::string_view line) {
-  if (silenced()) return;
-  Channels& channels = Channels::instance();
-  const std::lock_guard lock(channels.mutex);
-  if (!channels.captures.empty()) {
-    channels.captures.back()->systemLines_.emplace_back(line);
-    return;
-  }
-  std::string whole(line);
-  whole += '\n';
-  // Unbuffered, so that the line is out even if the process is about to end.
-  std::fwrite(whole.data(), 1, whole.size(), stderr);
-  writeToSystemLog(channels, line);
+WriterThread::WriterThread(std::size_t capacity) {
+  // exit() skips the owner's destructor but not this: the writer is still running then.
+  static const bool drainsAtExit = std::atexit([] { drain(); }) == 0;
+  (void)drainsAtExit;
+  LineQueue::instance().start(capacity);
+}
+
+WriterThread::~WriterThread() {
+  LineQueue::instance().stop();
+}
+
+void drain() {
+  LineQueue::instance().drain();
 }
 
 Capture::Capture() {
+  drain();
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   channels.captures.push_back(this);
 }
 
 Capture::~Capture() {
+  drain();
   Channels& channels = Channels::instance();
   const std::lock_guard lock(channels.mutex);
   std::erase(channels.captures, this);
 }
 
 std::vector<std::string> Capture::plainLines() const {
+  drain();
   const std::lock_guard lock(Channels::instance().mutex);
   return plainLines_;
 }
 
 std::vector<std::string> Capture::systemLines() const {
+  drain();
   const std::lock_guard lock(Channels::instance().mutex);
   return systemLines_;
 }
 
 std::size_t Capture::count(std::string_view line) const {
+  drain();
   const std::lock_guard lock(Channels::instance().mutex);
   const auto countIn = [line](const std::vector<std::string>& lines) {
     return static_cast<std::size_t>(std::count(lines.begin(), lines.end(), line));
@@ -154,6 +337,7 @@ std::size_t Capture::count(std::string_view line) const {
 }
 
 void Capture::clear() {
+  drain();
   const std::lock_guard lock(Channels::instance().mutex);
   plainLines_.clear();
   systemLines_.clear();

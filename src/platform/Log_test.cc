@@ -5,11 +5,18 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <boost/asio/signal_set.hpp>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
+#include <functional>
+#include <memory>
+#include <optional>
 #include <string>
 #include <thread>
 #include <vector>
+
+#include "platform/MainQueue.h"
 
 namespace platform::log {
 namespace {
@@ -159,6 +166,114 @@ TEST(ASilence, DropsTheLinesOfEveryChannelWhileItLives) {
   plain("kept");
   EXPECT_EQ(capture.plainLines(), std::vector<std::string>{"kept"});
   EXPECT_TRUE(capture.systemLines().empty());
+}
+
+}  // namespace
+}  // namespace platform::log
+
+namespace platform::log {
+namespace {
+
+// Writes lines of every kind, each in a known order, from this thread and from one other.
+void writeMixedLines() {
+  const auto described = std::make_shared<const Dictionary>(
+      Dictionary{{"rsrp", -97}, {"cells", List{Dictionary{{"pci", 12}}}}, {"band", "B3"}});
+  std::thread other([] {
+    for (int i = 0; i < 300; ++i)
+      plainf("other %d", i);
+  });
+  for (int i = 0; i < 300; ++i) {
+    plainf("Metric ID in Hex = %X", i);
+    plainDescribed("Received CA Status Dict is ", described);
+    if (i % 7 == 0) systemf("%s: MetricsTrigger dict=%d", "listen", i);
+    if (i % 50 == 0) warningf("warning %d", i);
+  }
+  other.join();
+}
+
+// The lines of this thread, without those of the other.
+Lines withoutOthers(Lines lines) {
+  std::erase_if(lines, [](const std::string& line) { return line.starts_with("other "); });
+  return lines;
+}
+
+Lines ofTheOther(const Lines& lines) {
+  Lines others;
+  for (const std::string& line : lines) {
+    if (line.starts_with("other ")) others.push_back(line);
+  }
+  return others;
+}
+
+TEST(AWriterThread, WritesTheLinesOfEachThreadInTheOrderWrittenWhateverItsCapacity) {
+  Capture direct;
+  writeMixedLines();
+  for (const std::size_t capacity :
+       {std::size_t{1}, std::size_t{5}, WriterThread::kDefaultCapacity}) {
+    Capture threaded;
+    {
+      const WriterThread writer(capacity);
+      writeMixedLines();
+    }
+    EXPECT_EQ(withoutOthers(threaded.plainLines()), withoutOthers(direct.plainLines()));
+    EXPECT_EQ(ofTheOther(threaded.plainLines()), ofTheOther(direct.plainLines()));
+    EXPECT_EQ(threaded.systemLines(), direct.systemLines());
+  }
+}
+
+TEST(AWriterThread, HandsEveryLineToACaptureThatBeginsOrEndsWhileItRuns) {
+  const WriterThread writer(3);
+  Capture outer;
+  plain("before");
+  {
+    Capture inner;
+    plain("inside");
+    EXPECT_EQ(inner.plainLines(), Lines{"inside"});
+  }
+  plain("after");
+  EXPECT_EQ(outer.plainLines(), (Lines{"before", "after"}));
+}
+
+// However the process ends its run, each line written before is on its standard output.
+TEST(AWriterThread, WritesOutEveryQueuedLineWhenTheProcessEnds) {
+  constexpr int kLines = 20'000;
+  std::string expected;
+  for (int i = 0; i < kLines; ++i)
+    expected += format("line %d\n", i);
+  const auto writeLines = [] {
+    for (int i = 0; i < kLines; ++i)
+      plainf("line %d", i);
+  };
+  // The programs end on SIGINT and SIGTERM by stopping the main queue and returning from main.
+  const auto endOnSignal = [&writeLines](int signal) {
+    const WriterThread writer(64);
+    boost::asio::signal_set signals(mainQueue(), signal);
+    signals.async_wait([](const auto&, int) { stopMainQueue(); });
+    writeLines();
+    ::kill(::getpid(), signal);
+    runMainQueue();
+  };
+  const struct {
+    std::string_view ending;
+    std::function<void()> body;
+  } kEndings[] = {
+      {"the writer's owner returns",
+       [&] {
+         const WriterThread writer(64);
+         writeLines();
+       }},
+      {"exit() while the writer runs",
+       [&] {
+         const auto writer = std::make_unique<WriterThread>(64);
+         writeLines();
+         std::exit(0);
+       }},
+      {"SIGTERM", [&] { endOnSignal(SIGTERM); }},
+      {"SIGINT", [&] { endOnSignal(SIGINT); }},
+  };
+  for (const auto& test : kEndings) {
+    EXPECT_EQ(standardOutputOfChild(test.body), expected) << test.ending;
+  }
 }
 
 }  // namespace

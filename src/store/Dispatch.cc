@@ -13,29 +13,30 @@ namespace {
 
 using platform::Dictionary;
 
-// Runs the steps of one handler over the display dictionary it has just stored.
+// Runs the steps of one handler over the display dictionary it has just stored. Once its log
+// line holds the dictionary, a step that changes it changes a copy.
 class StepRunner {
  public:
-  StepRunner(const Handler& handler, Dictionary& display, DisplayStore& store,
+  StepRunner(const Handler& handler, StoredDictionary& display, DisplayStore& store,
              const TimestampFormatter& formatTimestamp)
       : handler_(handler), display_(display), store_(store), formatTimestamp_(formatTimestamp) {}
 
   void operator()(const ConvertDisplayEntry& step) const {
-    convertEntry(display_, step.conversion, formatTimestamp_);
+    if (display().contains(step.conversion.key))
+      convertEntry(mutableDictionary(display_), step.conversion, formatTimestamp_);
   }
 
   void operator()(const ReplaceWithTextForm& step) const {
-    platform::Value* entry = display_.find(step.key);
-    if (entry == nullptr || !hasShape(*entry, step.shape)) return;
-    std::string text = entry->description();
+    const platform::Value* found = display().find(step.key);
+    if (found == nullptr || !hasShape(*found, step.shape)) return;
+    std::string text = found->description();
     if (step.logText) platform::log::plain(text);
-    *entry = std::move(text);
+    *mutableDictionary(display_).find(step.key) = std::move(text);
   }
 
   void operator()(const LogDisplayDictionary&) const {
-    std::string line(handler_.logPrefix);
-    platform::appendDescription(line, display_);
-    platform::log::plain(line);
+    platform::log::plainDescribed(handler_.logPrefix,
+                                  std::shared_ptr<const Dictionary>(display_, &display()));
   }
 
   void operator()(const RefreshKeys& step) const {
@@ -43,7 +44,7 @@ class StepRunner {
     Dictionary refreshed;
     refreshed.reserve(destination.size());
     for (const auto& [key, value] : destination) {
-      const platform::Value* fresh = display_.find(key);
+      const platform::Value* fresh = display().find(key);
       refreshed.append(key, fresh != nullptr ? *fresh : value);
     }
     for (const EntryConversion& conversion : step.conversions) {
@@ -55,9 +56,9 @@ class StepRunner {
   // Each metric of a kind brings rows of much the same shape, so the new rows are written over
   // the ones they replace and reuse their storage.
   void operator()(const CopyList& step) const {
-    const platform::Value* source = display_.find(step.key);
+    const platform::Value* source = display().find(step.key);
     if (source == nullptr || !hasShape(*source, ValueShape::DictionaryList)) return;
-    const Dictionary& parent = step.parent(store_, display_);
+    const Dictionary& parent = step.parent(store_, display());
     const platform::List& elements = *source->asList();
     platform::List& rows = step.destination(store_);
     rows.resize(elements.size());
@@ -76,8 +77,10 @@ class StepRunner {
   }
 
  private:
+  const Dictionary& display() const { return **display_; }
+
   const Handler& handler_;
-  Dictionary& display_;
+  StoredDictionary& display_;
   DisplayStore& store_;
   const TimestampFormatter& formatTimestamp_;
 };
@@ -127,15 +130,15 @@ bool runHandler(const Handler& handler, const platform::Bytes* payload, DisplayS
                 const TimestampFormatter& formatTimestamp, const DecodedObserver& observeDecoded) {
   std::optional<Dictionary> decoded = handler.decode(payload);
   if (!decoded) return false;
-  std::optional<Dictionary>& stored = store[handler.display];
-  stored = std::move(decoded);
-  if (observeDecoded) observeDecoded(*stored);
+  StoredDictionary& stored = store.slot(handler.display);
+  stored = std::make_shared<std::optional<Dictionary>>(std::move(decoded));
+  if (observeDecoded) observeDecoded(**stored);
   LastTimestampText lastText(formatTimestamp);
   // Holds a reference only, so it needs no allocation.
   const TimestampFormatter formatEachTimeOnce = [&lastText](double milliseconds) {
     return lastText(milliseconds);
   };
-  const StepRunner runStep(handler, *stored, store, formatEachTimeOnce);
+  const StepRunner runStep(handler, stored, store, formatEachTimeOnce);
   for (const HandlerStep& step : handler.steps)
     std::visit(runStep, step);
   return true;

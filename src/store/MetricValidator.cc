@@ -1,8 +1,10 @@
 #include "store/MetricValidator.h"
 
+#include <algorithm>
+#include <atomic>
+#include <charconv>
 #include <memory>
 
-#include "client/TarnWrapper.h"
 #include "platform/DateFormat.h"
 #include "platform/Format.h"
 #include "platform/Log.h"
@@ -15,21 +17,46 @@ namespace {
 
 constexpr std::string_view kTimestampPattern = "yyyy-MM-dd HH:mm:ss zzz";
 
+std::atomic<MetricSession*> sharedSession{nullptr};
+
+// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its
+// 64 bits, at least two wide), without the general formatter: the line is
+// written for every metric.
+std::string metricIDLine(std::int64_t metricID) {
+  constexpr std::string_view kPrefix = "Metric ID in Hex = ";
+  char digits[16];
+  char* const last =
+      std::to_chars(digits, digits + sizeof digits, static_cast<std::uint64_t>(metricID), 16).ptr;
+  std::transform(digits, last, digits,
+                 [](char c) { return c >= 'a' ? static_cast<char>(c - 'a' + 'A') : c; });
+  const auto length = static_cast<std::size_t>(last - digits);
+  std::string line;
+  line.reserve(kPrefix.size() + std::max<std::size_t>(length, 2));
+  line.append(kPrefix);
+  if (length < 2) line.push_back(' ');
+  line.append(digits, length);
+  return line;
+}
+
 }  // namespace
+
+void MetricValidator::setSharedSession(MetricSession* session) {
+  sharedSession = session;
+}
 
 MetricValidator& MetricValidator::sharedInstance() {
   // Never released; the session holds it weakly as its delegate.
   static const std::shared_ptr<MetricValidator>* const shared = [] {
-    TarnWrapper& session = TarnWrapper::sharedInstance();
+    MetricSession* session = sharedSession.load();
     auto* validator =
-        new std::shared_ptr<MetricValidator>(std::make_shared<MetricValidator>(&session));
-    session.setDelegate(*validator);
+        new std::shared_ptr<MetricValidator>(std::make_shared<MetricValidator>(session));
+    if (session != nullptr) session->setDelegate(*validator);
     return validator;
   }();
   return **shared;
 }
 
-MetricValidator::MetricValidator(TarnWrapper* session) : mySharedTarnInstance_(session) {
+MetricValidator::MetricValidator(MetricSession* session) : mySharedTarnInstance_(session) {
   if (mySharedTarnInstance_ != nullptr) mySharedTarnInstance_->listen();
 }
 
@@ -52,7 +79,7 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     platform::log::plain("The metric record has no integer \"kKeyMetricID\"; nothing to do");
     return false;
   }
-  platform::log::plainf("Metric ID in Hex = %2X", *metricID_);
+  platform::log::plain(metricIDLine(*metricID_));
 
   const Handler* handler = handlerFor(*metricID_);
   if (handler == nullptr) {

@@ -8,14 +8,13 @@
 #include <string_view>
 #include <vector>
 
-#include "client/TarnWrapperDelegate.h"
 #include "messages/Metrics.h"
 #include "platform/Value.h"
 #include "store/DisplayDictionaries.h"
 #include "store/DisplayStore.h"
 #include "store/ListRecords.h"
-
-class TarnWrapper;
+#include "store/MetricSession.h"
+#include "tarn/client/TarnWrapperDelegate.h"
 
 namespace store {
 
@@ -77,15 +76,18 @@ class MetricValidator : public TarnWrapperDelegate {
   static constexpr std::string_view payloadKey = "kKeyPayload";
   static constexpr std::string_view profileIDKey = "kKeyProfileID";
 
-  // The shared intake, created on first use: it listens on the shared session and is its
-  // delegate from then on.
+  // The shared intake, created on first use: it listens on the shared session (when the app has
+  // handed one over) and is its delegate from then on.
   static MetricValidator& sharedInstance();
+  // The session of the shared intake, which must outlive it; for the app to hand over before
+  // the first sharedInstance(). Afterwards it changes nothing.
+  static void setSharedSession(MetricSession* session);
 
   // An empty store. With a session it calls the session's listen(); making it the session's
   // delegate is the owner's part, since the session holds its delegate weakly.
-  explicit MetricValidator(TarnWrapper* session);
+  explicit MetricValidator(MetricSession* session);
 
-  TarnWrapper* mySharedTarnInstance() const { return mySharedTarnInstance_; }
+  MetricSession* mySharedTarnInstance() const { return mySharedTarnInstance_; }
 
   // The metric ID of the latest metric record handled; empty before the first and after one
   // without an integer ID.
@@ -109,7 +111,7 @@ class MetricValidator : public TarnWrapperDelegate {
     return store_[DisplayDictionary::name];                                \
   }                                                                        \
   void setMy##name##Dict(std::optional<platform::Dictionary> dictionary) { \
-    store_[DisplayDictionary::name] = std::move(dictionary);               \
+    store_.replace(DisplayDictionary::name, std::move(dictionary));        \
   }
   NORVO_DISPLAY_DICTIONARIES(NORVO_DISPLAY_ACCESSORS)
 #undef NORVO_DISPLAY_ACCESSORS
@@ -163,7 +165,7 @@ class MetricValidator : public TarnWrapperDelegate {
   virtual std::optional<std::string> formatTimestamp(double milliseconds) const;
 
  private:
-  TarnWrapper* const mySharedTarnInstance_;
+  MetricSession* const mySharedTarnInstance_;
   std::optional<std::int64_t> metricID_;
   DisplayStore store_;
   std::vector<AcceptedMetricObserver> acceptedMetricObservers_;

@@ -3,10 +3,16 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <limits>
+#include <optional>
+#include <tuple>
+#include <vector>
+
 #include "messages/Records.h"
 #include "oracle/RandomMessage.h"
 #include "store/StoreDump.h"
 #include "store/StoreTesting.h"
+#include "tarn/sim/Simulator.h"
 
 namespace store {
 namespace {
@@ -83,11 +89,22 @@ TEST_F(MetricValidatorTest, PassesOverMetricsWithoutAHandlerAndKeepsTheStore) {
 }
 
 TEST_F(MetricValidatorTest, WritesTheMetricIdInUpperCaseHexAtLeastTwoWide) {
-  validator.metricsDidUpdate({{"kKeyMetricID", 0xA}});
-  validator.metricsDidUpdate(
-      {{"kKeyMetricID", MetricValidator::K_LTE_SEL_RESEL_INFO}, {"kKeyPayload", Bytes{0xFF}}});
-  EXPECT_EQ(log.plainLines().front(), "Metric ID in Hex =  A");
-  EXPECT_EQ(log.count("Metric ID in Hex = 3CD30E"), 1u);
+  const struct {
+    std::int64_t metricID;
+    std::string_view line;
+  } kCases[] = {
+      {0, "Metric ID in Hex =  0"},
+      {0xA, "Metric ID in Hex =  A"},
+      {0x3CD30E, "Metric ID in Hex = 3CD30E"},
+      {-1, "Metric ID in Hex = FFFFFFFFFFFFFFFF"},
+      {std::numeric_limits<std::int64_t>::min(), "Metric ID in Hex = 8000000000000000"},
+  };
+  for (const auto& test : kCases) {
+    log.clear();
+    validator.metricsDidUpdate({{"kKeyMetricID", test.metricID}, {"kKeyPayload", Bytes{0xFF}}});
+    EXPECT_EQ(log.plainLines().front(), test.line);
+    EXPECT_EQ(platform::format("Metric ID in Hex = %2X", test.metricID), test.line);
+  }
 }
 
 TEST_F(MetricValidatorTest, IgnoresRecordsWithoutAnIntegerMetricId) {
@@ -251,6 +268,46 @@ TEST_F(MetricValidatorTest, TakesInAnyWellFormedRecordOfTheMetricsClass) {
       ASSERT_THAT(lines, ::testing::Contains(StartsWith(route.logPrefix))) << route.recordClass;
       ASSERT_EQ(lines.back(), "Received Valid Metric") << route.recordClass << " seed " << seed;
     }
+  }
+}
+
+// Lines made and written on a writer thread are those the intake writes itself, in the same
+// order among the lines of other code, and the store ends up the same: a dictionary that a
+// queued line still describes is not changed under it. A small queue makes the intake wait.
+TEST_F(MetricValidatorTest, WritesTheSameLinesInTheSameOrderThroughAWriterThread) {
+  tarn::sim::Simulator simulator(7, kJuly14);
+  std::vector<Dictionary> records;
+  for (const tarn::sim::TimedMetric& timed : simulator.advance(20 * 60 * 1000)) {
+    records.push_back({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
+                       {"kKeyPayload", timed.metric.payload}});
+  }
+  const auto takeIn = [&](std::optional<std::size_t> queueCapacity) {
+    validator.clearStore();
+    log.clear();
+    std::optional<platform::log::WriterThread> writer;
+    if (queueCapacity) writer.emplace(*queueCapacity);
+    for (std::size_t i = 0; i < records.size(); ++i) {
+      validator.metricsDidUpdate(records[i]);
+      if (i % 5 == 0) platform::log::plainf("between metrics %zu", i);
+      if (i % 9 == 0) platform::log::systemf("%s: MetricsTrigger dict=%zu", "listen", i);
+      if (i % 97 == 0) platform::log::warningf("warning %zu", i);
+    }
+    writer.reset();
+    return std::make_tuple(log.plainLines(), log.systemLines(), dumpStore(validator));
+  };
+
+  const auto direct = takeIn(std::nullopt);
+  // The handlers that change their dictionary after logging it are among those taken in.
+  for (const std::string_view prefix :
+       {"Received LTE Cell Resel Info is ", "Received UMTS Cell Resel Info is ",
+        "Received Bearer Context Info is "}) {
+    EXPECT_THAT(std::get<0>(direct), ::testing::Contains(StartsWith(prefix)));
+  }
+  for (const std::size_t capacity : {std::size_t{1}, std::size_t{7}, std::size_t{4096}}) {
+    const auto threaded = takeIn(capacity);
+    EXPECT_EQ(std::get<0>(threaded), std::get<0>(direct)) << "capacity " << capacity;
+    EXPECT_EQ(std::get<1>(threaded), std::get<1>(direct)) << "capacity " << capacity;
+    EXPECT_EQ(std::get<2>(threaded), std::get<2>(direct)) << "capacity " << capacity;
   }
 }
 

@@ -5,14 +5,13 @@
 #include <limits>
 #include <ostream>
 #include <stdexcept>
+#include <utility>
 
 #include "messages/Metrics.h"
 #include "tarn/log/MetricLog.h"
 
 namespace tarn::replay {
 namespace {
-
-using Clock = std::chrono::steady_clock;
 
 using messages::metric::KCellularSimCardFiles;
 
@@ -40,8 +39,9 @@ std::optional<service::Metric> metricOf(const platform::Dictionary& record, std:
 
 }  // namespace
 
-ReplaySource::ReplaySource(const std::string& path, ReplayOptions options, std::ostream& errors)
-    : options_(checked(options)) {
+ReplaySource::ReplaySource(const std::string& path, ReplayOptions options, std::ostream& errors,
+                           std::shared_ptr<service::SourceClock> clock)
+    : options_(checked(options)), clock_(std::move(clock)) {
   std::ifstream file(path, std::ios::binary);
   if (!file) throw std::runtime_error("cannot read " + path);
   log::MetricLogReader reader(file);
@@ -88,24 +88,25 @@ std::optional<service::Metric> ReplaySource::query(std::uint32_t metricId) {
 
 void ReplaySource::run(std::stop_token stop, const std::function<void(service::Metric)>& deliver) {
   if (metrics_.empty()) return;
-  const Clock::time_point began = Clock::now();
+  const service::SourceClock::TimePoint began = clock_->now();
   // Log time at which the current pass began: each loop carries on from the last metric.
   std::int64_t passMs = 0;
-  std::unique_lock lock(mutex_);
+  // The clock waits with a lock held; this one is the worker's alone, so that stop() never
+  // waits for a worker that delivers without pause.
+  std::mutex waiting;
+  std::unique_lock lock(waiting);
   do {
     for (const Timed& timed : metrics_) {
       if (options_.speed) {
         const auto due =
-            began +
-            std::chrono::duration_cast<Clock::duration>(std::chrono::duration<double, std::milli>(
-                static_cast<double>(passMs + timed.deliveryMs) / *options_.speed));
-        if (wake_.wait_until(lock, stop, due, [&stop] { return stop.stop_requested(); })) return;
+            began + std::chrono::duration_cast<std::chrono::nanoseconds>(
+                        std::chrono::duration<double, std::milli>(
+                            static_cast<double>(passMs + timed.deliveryMs) / *options_.speed));
+        if (clock_->waitUntil(lock, stop, due)) return;
       } else if (stop.stop_requested()) {
         return;
       }
-      lock.unlock();
       deliver(timed.metric);
-      lock.lock();
     }
     passMs += metrics_.back().deliveryMs;
   } while (options_.loop);

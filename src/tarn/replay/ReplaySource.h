@@ -1,9 +1,9 @@
 #pragma once
 
-#include <condition_variable>
 #include <cstdint>
 #include <functional>
 #include <iosfwd>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <stop_token>
@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "tarn/service/MetricSource.h"
+#include "tarn/service/SourceClock.h"
 
 namespace tarn::replay {
 
@@ -29,8 +30,10 @@ class ReplaySource final : public service::MetricSource {
  public:
   // Reads the whole log at `path` now. A line that does not parse, or whose record lacks an
   // integer "kKeyMetricID" or a payload, is reported on `errors` as "PATH:LINE: ..." and skipped.
-  // Throws std::runtime_error when the file cannot be read.
-  ReplaySource(const std::string& path, ReplayOptions options, std::ostream& errors);
+  // Throws std::runtime_error when the file cannot be read. The "t_ms" gaps pass on `clock`,
+  // the machine's steady clock unless given.
+  ReplaySource(const std::string& path, ReplayOptions options, std::ostream& errors,
+               std::shared_ptr<service::SourceClock> clock = service::SteadyClock::shared());
   ~ReplaySource() override;
   ReplaySource(const ReplaySource&) = delete;
   ReplaySource& operator=(const ReplaySource&) = delete;
@@ -53,10 +56,10 @@ class ReplaySource final : public service::MetricSource {
   void run(std::stop_token stop, const std::function<void(service::Metric)>& deliver);
 
   const ReplayOptions options_;
+  const std::shared_ptr<service::SourceClock> clock_;
   std::vector<Timed> metrics_;
   std::optional<service::Metric> simFiles_;
   std::mutex mutex_;  // guards the worker
-  std::condition_variable_any wake_;
   std::jthread worker_;
 };
 

@@ -4,14 +4,17 @@
 #include <unistd.h>
 
 #include <chrono>
+#include <condition_variable>
 #include <filesystem>
 #include <fstream>
+#include <memory>
 #include <mutex>
 #include <sstream>
 #include <stdexcept>
 #include <string>
-#include <thread>
 #include <vector>
+
+#include "tarn/testing/ManualClock.h"
 
 using namespace std::chrono_literals;
 using tarn::replay::ReplayOptions;
@@ -19,8 +22,6 @@ using tarn::replay::ReplaySource;
 using tarn::service::Metric;
 
 namespace {
-
-using Clock = std::chrono::steady_clock;
 
 // "AQI=" is the payload {1, 2}.
 std::string line(std::uint32_t metricId, std::int64_t deliveryMs) {
@@ -43,30 +44,25 @@ class ReplaySourceTest : public ::testing::Test {
     return path;
   }
 
-  // The metric IDs delivered, with when each came after start().
+  // The metric IDs delivered, with the clock's time since start() at each.
   struct Delivered {
     std::uint32_t metricId;
-    Clock::duration after;
+    std::chrono::nanoseconds after;
   };
 
   void startRecording(ReplaySource& source) {
-    const Clock::time_point began = Clock::now();
+    const auto began = clock->now();
     source.start([this, began](Metric metric) {
-      std::lock_guard lock(mutex_);
-      delivered_.push_back({metric.metricId, Clock::now() - began});
+      const std::lock_guard lock(mutex_);
+      delivered_.push_back({metric.metricId, clock->now() - began});
+      arrived_.notify_all();
     });
   }
 
-  std::vector<Delivered> waitFor(std::size_t count, std::chrono::milliseconds timeout = 5s) {
-    const Clock::time_point until = Clock::now() + timeout;
-    while (Clock::now() < until) {
-      {
-        std::lock_guard lock(mutex_);
-        if (delivered_.size() >= count) return delivered_;
-      }
-      std::this_thread::sleep_for(1ms);
-    }
-    std::lock_guard lock(mutex_);
+  // Waits for `count` metrics (a stuck source fails by the test's timeout).
+  std::vector<Delivered> waitFor(std::size_t count) {
+    std::unique_lock lock(mutex_);
+    arrived_.wait(lock, [this, count] { return delivered_.size() >= count; });
     return delivered_;
   }
 
@@ -77,59 +73,74 @@ class ReplaySourceTest : public ::testing::Test {
     return result;
   }
 
+  std::shared_ptr<tarn::testing::ManualClock> clock =
+      std::make_shared<tarn::testing::ManualClock>();
   std::filesystem::path directory_;
   std::mutex mutex_;
+  std::condition_variable arrived_;
   std::vector<Delivered> delivered_;
 };
 
 TEST_F(ReplaySourceTest, DeliversTheLogInOrderAtItsTimesScaledBySpeed) {
-  // 2000 ms of log at speed 20: 100 ms of wall clock.
+  // 2000 ms of log at speed 20: 100 ms on the clock.
   const std::string path = writeLog(line(1, 0) + line(2, 1000) + line(3, 2000));
   std::ostringstream errors;
-  ReplaySource source(path, {.speed = 20.0, .loop = false}, errors);
+  ReplaySource source(path, {.speed = 20.0, .loop = false}, errors, clock);
   startRecording(source);
+  clock->awaitWaiter();
+  EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
+  clock->advance(49ms);
+  clock->awaitWaiter();
+  EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
+  clock->advance(1ms);
+  clock->awaitWaiter();
+  EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1, 2}));
+  clock->advance(50ms);
   const std::vector<Delivered> delivered = waitFor(3);
   ASSERT_EQ(ids(delivered), (std::vector<std::uint32_t>{1, 2, 3}));
-  EXPECT_LT(delivered[0].after, 40ms);
-  EXPECT_GE(delivered[1].after, 50ms);
-  EXPECT_GE(delivered[2].after, 100ms);
-  EXPECT_LT(delivered[2].after, 1000ms);
+  EXPECT_EQ(delivered[0].after, 0ms);
+  EXPECT_EQ(delivered[1].after, 50ms);
+  EXPECT_EQ(delivered[2].after, 100ms);
   EXPECT_TRUE(errors.str().empty());
 }
 
 TEST_F(ReplaySourceTest, WithoutSpeedDeliversEverythingAtOnceIgnoringTheGaps) {
   const std::string path = writeLog(line(1, 0) + line(2, 3'600'000) + line(3, 7'200'000));
   std::ostringstream errors;
-  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors);
+  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors, clock);
   startRecording(source);
-  const std::vector<Delivered> delivered = waitFor(3, 1s);
-  EXPECT_EQ(ids(delivered), (std::vector<std::uint32_t>{1, 2, 3}));
+  EXPECT_EQ(ids(waitFor(3)), (std::vector<std::uint32_t>{1, 2, 3}));
 }
 
 TEST_F(ReplaySourceTest, LoopingStartsOverAfterTheLastMetricAndStopsOnlyWhenAsked) {
   const std::string path = writeLog(line(1, 0) + line(2, 10));
   std::ostringstream errors;
-  ReplaySource source(path, {.speed = 10.0, .loop = true}, errors);
+  ReplaySource source(path, {.speed = 10.0, .loop = true}, errors, clock);
   startRecording(source);
+  // Each pass carries on 1 ms after the last: 1 at 0, 2 at 1, 1 at 1, 2 at 2, 1 at 2...
+  for (int ms = 0; ms < 3; ++ms) {
+    clock->awaitWaiter();
+    clock->advance(1ms);
+  }
   const std::vector<Delivered> delivered = waitFor(5);
   source.stop();
-  ASSERT_GE(delivered.size(), 5u);
   EXPECT_EQ(ids(delivered).at(2), 1u);
   EXPECT_EQ(ids(delivered).at(3), 2u);
   EXPECT_EQ(ids(delivered).at(4), 1u);
+  EXPECT_EQ(delivered.at(2).after, delivered.at(1).after);
 
   const std::size_t afterStop = waitFor(0).size();
-  std::this_thread::sleep_for(20ms);
+  clock->advance(1h);
   EXPECT_EQ(waitFor(0).size(), afterStop);
 }
 
 TEST_F(ReplaySourceTest, WithoutLoopingDeliversTheLogOnce) {
   const std::string path = writeLog(line(1, 0) + line(2, 1));
   std::ostringstream errors;
-  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors);
+  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors, clock);
   startRecording(source);
   waitFor(2);
-  std::this_thread::sleep_for(20ms);
+  source.stop();  // the worker has ended on its own, or ends now
   EXPECT_EQ(waitFor(0).size(), 2u);
 }
 
@@ -158,15 +169,14 @@ TEST_F(ReplaySourceTest, ReportsBrokenLinesWithTheirNumbersAndReplaysTheRest) {
   EXPECT_EQ(ids(waitFor(2)), (std::vector<std::uint32_t>{1, 2}));
 }
 
-TEST_F(ReplaySourceTest, StopReturnsPromptlyInTheMiddleOfALongGap) {
+// The clock never reaches the second metric: stop() must not wait for it.
+TEST_F(ReplaySourceTest, StopsInTheMiddleOfALongGap) {
   const std::string path = writeLog(line(1, 0) + line(2, 3'600'000));
   std::ostringstream errors;
-  ReplaySource source(path, {.speed = 1.0, .loop = false}, errors);
+  ReplaySource source(path, {.speed = 1.0, .loop = false}, errors, clock);
   startRecording(source);
-  waitFor(1);
-  const Clock::time_point stopping = Clock::now();
+  clock->awaitWaiter();
   source.stop();
-  EXPECT_LT(Clock::now() - stopping, 500ms);
   EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
 }
 

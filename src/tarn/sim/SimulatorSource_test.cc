@@ -3,12 +3,13 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <memory>
 #include <mutex>
 #include <stdexcept>
-#include <thread>
 #include <vector>
 
 #include "messages/Metrics.h"
+#include "tarn/testing/ManualClock.h"
 
 namespace tarn::sim {
 namespace {
@@ -45,36 +46,48 @@ class Received {
   std::vector<service::Metric> metrics_;
 };
 
+// Moves the clock on by `wall` in the worker's ticks, each time until the worker has delivered
+// what came due.
+void runFor(testing::ManualClock& clock, std::chrono::milliseconds wall) {
+  for (auto passed = 0ms; passed < wall; passed += 20ms) {
+    clock.awaitWaiter();
+    clock.advance(20ms);
+  }
+  clock.awaitWaiter();
+}
+
 TEST(ASimulatorSource, RunsSimulatedTimeAtItsSpeedAndStopsDeliveringWhenStopped) {
-  constexpr double kSpeed = 40.0;
-  SimulatorSource source(2, kSpeed, kStartMs);
-  Received received;
-  const auto began = std::chrono::steady_clock::now();
-  source.start(received.sink());
-  std::this_thread::sleep_for(300ms);
-  source.stop();
-  const double wallMs =
-      std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - began).count();
+  // At the fastest speed a tick is 200 s of simulated time, delivered in slices of 1 s.
+  for (const double speed : {40.0, SimulatorSource::kFastest}) {
+    const auto clock = std::make_shared<testing::ManualClock>();
+    SimulatorSource source(2, speed, kStartMs, clock);
+    Received received;
+    source.start(received.sink());
+    runFor(*clock, 300ms);
+    source.stop();
 
-  const auto metrics = received.metrics();
-  ASSERT_FALSE(metrics.empty());
-  const double simulatedMs = static_cast<double>(timestampOf(metrics.back()) - kStartMs);
-  EXPECT_LE(simulatedMs, wallMs * kSpeed);
-  EXPECT_GE(simulatedMs, 0.5 * wallMs * kSpeed);
+    const auto metrics = received.metrics();
+    ASSERT_FALSE(metrics.empty()) << speed;
+    const double simulatedMs = static_cast<double>(timestampOf(metrics.back()) - kStartMs);
+    EXPECT_LE(simulatedMs, 300 * speed) << speed;
+    // RSRP samples come every 1.75 s of simulated time.
+    EXPECT_GT(simulatedMs, 300 * speed - 1750) << speed;
 
-  std::this_thread::sleep_for(50ms);
-  EXPECT_EQ(received.metrics().size(), metrics.size());
+    clock->advance(1h);
+    EXPECT_EQ(received.metrics().size(), metrics.size()) << speed;
+  }
 }
 
 TEST(ASimulatorSource, ResumesTheDriveWhereItStopped) {
-  SimulatorSource source(2, 50.0, kStartMs);
+  const auto clock = std::make_shared<testing::ManualClock>();
+  SimulatorSource source(2, 50.0, kStartMs, clock);
   Received first;
   source.start(first.sink());
-  std::this_thread::sleep_for(100ms);
+  runFor(*clock, 100ms);
   source.stop();
   Received second;
   source.start(second.sink());
-  std::this_thread::sleep_for(100ms);
+  runFor(*clock, 100ms);
   source.stop();
   ASSERT_FALSE(first.metrics().empty());
   ASSERT_FALSE(second.metrics().empty());

@@ -5,7 +5,7 @@
 #include <span>
 #include <string_view>
 
-#include "tarn/client/TarnWrapperDelegate.h"
+#include "client/TarnWrapperDelegate.h"
 
 namespace app {
 

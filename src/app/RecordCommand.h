@@ -10,7 +10,7 @@
 #include <string_view>
 
 #include "app/ServiceOption.h"
-#include "tarn/client/TarnWrapperDelegate.h"
+#include "client/TarnWrapperDelegate.h"
 #include "export/MetricExport.h"
 #include "tarn/log/MetricLog.h"
 

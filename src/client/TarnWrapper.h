@@ -6,7 +6,7 @@
 #include <optional>
 #include <string_view>
 
-#include "tarn/client/TarnWrapperDelegate.h"
+#include "client/TarnWrapperDelegate.h"
 #include "platform/SerialQueue.h"
 #include "tarn/Ipc.h"
 #include "tarn/client/Client.h"

@@ -2,7 +2,7 @@
 
 #include <memory>
 
-#include "tarn/client/TarnWrapperDelegate.h"
+#include "client/TarnWrapperDelegate.h"
 
 namespace store {
 

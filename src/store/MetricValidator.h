@@ -8,13 +8,13 @@
 #include <string_view>
 #include <vector>
 
+#include "client/TarnWrapperDelegate.h"
 #include "messages/Metrics.h"
 #include "platform/Value.h"
 #include "store/DisplayDictionaries.h"
 #include "store/DisplayStore.h"
 #include "store/ListRecords.h"
 #include "store/MetricSession.h"
-#include "tarn/client/TarnWrapperDelegate.h"
 
 namespace store {
 

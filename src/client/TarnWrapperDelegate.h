@@ -2,9 +2,7 @@
 
 #include "platform/Value.h"
 
-// Receives what the baseband manager service delivers, always on the main queue: the delegate of
-// the app's session (client/TarnWrapper). It lives beside the client library rather than beside
-// the session, so that a receiver such as the metric intake needs to know no session.
+// Receives what the baseband manager service delivers, always on the main queue.
 class TarnWrapperDelegate {
  public:
   virtual ~TarnWrapperDelegate() = default;

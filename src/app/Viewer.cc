@@ -40,7 +40,8 @@
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]] [--service WHERE]\n"
+    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]]\n"
+    "             [--tls-cert FILE --tls-key FILE] [--service WHERE]\n"
     "             [--log FILE] [--replay LOG.jsonl [--speed X] [--loop]] [--alerts FILE]\n"
     "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
@@ -57,6 +58,9 @@ const std::string_view kViewerUsage =
     "                      free port.\n"
     "  --token-file FILE   the access token to ask for, from FILE, instead of a new one\n"
     "  --no-auth           show the pages beyond loopback to anyone, with no token\n"
+    "  --tls-cert FILE     serve the pages over HTTPS with this PEM certificate (its chain\n"
+    "                      may follow it) ...\n"
+    "  --tls-key FILE      ... and this PEM private key (docs/security.md)\n"
     "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
     "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
     "                      or \"dbus:ADDRESS\" on another bus;\n"
@@ -110,7 +114,7 @@ std::nullopt_t refuse(std::string_view why) {
 // The arguments of the viewer, as given.
 struct GivenOptions {
   std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile,
-      alerts, tokenFile;
+      alerts, tokenFile, tlsCert, tlsKey;
   bool loop = false;
   bool noAuth = false;
 };
@@ -134,7 +138,7 @@ std::optional<std::string> readToken(std::string_view path) {
 // Empty, after saying why on standard error, when the values make no sense.
 std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
   const auto& [listen, service, replay, speed, source, refresh, log, caFile, alerts, tokenFile,
-               loop, noAuth] = given;
+               tlsCert, tlsKey, loop, noAuth] = given;
   ViewerOptions options;
   if (listen) {
     const auto endpoint = ui::web::parseListenAddress(*listen);
@@ -162,6 +166,15 @@ std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
       } catch (const std::runtime_error& error) {
         return refuse(error.what());
       }
+    }
+  }
+  if (tlsCert.has_value() != tlsKey.has_value())
+    return refuse("--tls-cert and --tls-key go together");
+  if (tlsCert) {
+    try {
+      options.display.tls = ui::web::loadTlsContext(std::string(*tlsCert), std::string(*tlsKey));
+    } catch (const std::runtime_error& error) {
+      return refuse(error.what());
     }
   }
   if (service) {
@@ -257,6 +270,8 @@ int runViewer(std::span<const std::string_view> arguments) {
       {"--alerts", &given.alerts, "an alerts file"},
       {"--token-file", &given.tokenFile, "a file name"},
       {"--no-auth", &given.noAuth},
+      {"--tls-cert", &given.tlsCert, "a certificate file"},
+      {"--tls-key", &given.tlsKey, "a private key file"},
   };
   if (const auto exit = platform::openCommandLine({"norvo", kViewerUsage}, arguments, table, {},
                                                   std::cout, std::cerr)) {

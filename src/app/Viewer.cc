@@ -242,15 +242,22 @@ std::string sourceName(const ViewerOptions& options) {
   return "simulated phone";
 }
 
-// How the viewer keeps up: the events its session dropped because it fell behind, by kind.
-platform::Dictionary viewerStatus() {
+// How the viewer keeps up: the events its session dropped because it fell behind, by kind; and,
+// with a service on a bus or behind a broker, whether it is reached.
+platform::Dictionary viewerStatus(const tarn::client::LinkStatus* link) {
   platform::Dictionary dropped;
   std::uint64_t total = 0;
   for (const auto& [kind, count] : tarn::client::droppedEvents()) {
     dropped.append(tarn::flow::kindName(kind), count);
     total += count;
   }
-  return {{"dropped_events", total}, {"dropped_by_kind", std::move(dropped)}};
+  platform::Dictionary status = {{"dropped_events", total},
+                                 {"dropped_by_kind", std::move(dropped)}};
+  if (link) {
+    const auto [connected, text] = link->get();
+    status.append("service", platform::Dictionary{{"connected", connected}, {"status", text}});
+  }
+  return status;
 }
 
 }  // namespace
@@ -284,13 +291,14 @@ int runViewer(std::span<const std::string_view> arguments) {
   // Elsewhere, tarnd or the broker brings its own.
   std::shared_ptr<tarn::service::MetricSource> source;
   std::optional<player::Drive> drive;
+  std::shared_ptr<const tarn::client::LinkStatus> link;
   try {
     if (options->replayPath) {
       drive = player::readDrive(*options->replayPath, std::cerr);
     } else if (options->service.builtIn()) {
       source = builtInSource(*options);
     }
-    useService(options->service, std::move(source));
+    link = useService(options->service, std::move(source));
   } catch (const std::runtime_error& error) {
     std::cerr << "norvo: " << error.what() << '\n';
     return 1;
@@ -302,6 +310,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   const std::unique_ptr<ViewerOutput> output =
       ViewerOutput::open(options->log, sourceName(*options), levels);
   if (!output) return 1;
+  output->setLink(link);
 
   ui::DisplayOptions display = std::move(options->display);
   display.readings.emplace("store",
@@ -335,7 +344,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   chrome.activeAlerts = [&alerts] { return alerts.active(); };
   if (replay) chrome.replayState = [&replay] { return replay->stateDictionary(); };
   chrome.addReading(display);
-  display.readings.emplace("status", [] { return platform::toJson(viewerStatus()); });
+  display.readings.emplace("status", [link] { return platform::toJson(viewerStatus(link.get())); });
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

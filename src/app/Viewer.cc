@@ -168,14 +168,10 @@ std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
       }
     }
   }
-  if (tlsCert.has_value() != tlsKey.has_value())
-    return refuse("--tls-cert and --tls-key go together");
-  if (tlsCert) {
-    try {
-      options.display.tls = ui::web::loadTlsContext(std::string(*tlsCert), std::string(*tlsKey));
-    } catch (const std::runtime_error& error) {
-      return refuse(error.what());
-    }
+  try {
+    options.display.tls = ui::web::tlsContextOfOptions(tlsCert, tlsKey);
+  } catch (const std::runtime_error& error) {
+    return refuse(error.what());
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);

@@ -51,6 +51,14 @@ std::shared_ptr<TlsContext> loadTlsContext(const std::string& certificateFile,
   return tls;
 }
 
+std::shared_ptr<TlsContext> tlsContextOfOptions(std::optional<std::string_view> certificateFile,
+                                                std::optional<std::string_view> keyFile) {
+  if (certificateFile.has_value() != keyFile.has_value())
+    throw std::runtime_error("--tls-cert and --tls-key go together");
+  if (!certificateFile) return nullptr;
+  return loadTlsContext(std::string(*certificateFile), std::string(*keyFile));
+}
+
 namespace serving {
 
 template <>

@@ -1,7 +1,9 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
+#include <string_view>
 
 namespace ui::web {
 
@@ -14,5 +16,10 @@ class TlsContext;
 // PEM, or a key that does not belong to the certificate.
 std::shared_ptr<TlsContext> loadTlsContext(const std::string& certificateFile,
                                            const std::string& keyFile);
+
+// The context of the options --tls-cert and --tls-key as given: null when neither is. Throws
+// std::runtime_error when only one is, or as loadTlsContext does.
+std::shared_ptr<TlsContext> tlsContextOfOptions(std::optional<std::string_view> certificateFile,
+                                                std::optional<std::string_view> keyFile);
 
 }  // namespace ui::web

@@ -87,6 +87,23 @@ TEST(TlsContext, RefusesFilesThatAreMissingNotPemOrDoNotBelongTogetherNamingTheF
   EXPECT_NE(loadTlsContext(files.certificate.string(), files.key.string()), nullptr);
 }
 
+TEST(TlsContext, OfTheOptionsIsNoneWithoutThemAndWantsBoth) {
+  const TestCertificate files;
+  const std::string certificate = files.certificate.string(), key = files.key.string();
+  EXPECT_EQ(tlsContextOfOptions(std::nullopt, std::nullopt), nullptr);
+  EXPECT_NE(tlsContextOfOptions(certificate, key), nullptr);
+  for (const auto& [certificateFile, keyFile] :
+       {std::pair{std::optional<std::string_view>(certificate), std::optional<std::string_view>()},
+        std::pair{std::optional<std::string_view>(), std::optional<std::string_view>(key)}}) {
+    try {
+      tlsContextOfOptions(certificateFile, keyFile);
+      ADD_FAILURE() << "took one without the other";
+    } catch (const std::runtime_error& error) {
+      EXPECT_STREQ(error.what(), "--tls-cert and --tls-key go together");
+    }
+  }
+}
+
 // A server over TLS whose every answer needs the token, on a thread of its own, and HTTPS
 // clients that trust only the test certificate.
 class ATlsServer : public ::testing::Test {

@@ -10,7 +10,7 @@ packages=(
   libboost1.81-dev libboost-json1.81-dev
   libsdbus-c++-dev libsystemd-dev dbus-daemon libicu-dev modemmanager-dev
   libgtest-dev libgmock-dev libbenchmark-dev
-  libmosquitto-dev mosquitto openssl
+  libmosquitto-dev mosquitto openssl libssl-dev
   libtomlplusplus-dev
   chromium nodejs
   tshark

@@ -55,8 +55,11 @@ std::string_view hostName(std::string_view host) {
 }  // namespace
 
 DeviceViewers::DeviceViewers(tarn::mqtt::BrokerAddress broker, std::optional<std::string> caFile,
-                             boost::asio::ip::address listen)
-    : broker_(std::move(broker)), caFile_(std::move(caFile)), listen_(listen) {}
+                             boost::asio::ip::address listen, std::optional<TlsFiles> tls)
+    : broker_(std::move(broker)),
+      caFile_(std::move(caFile)),
+      listen_(listen),
+      tls_(std::move(tls)) {}
 
 DeviceViewers::~DeviceViewers() {
   for (const auto& [device, viewer] : viewers_)
@@ -78,7 +81,8 @@ std::optional<std::string> DeviceViewers::open(const std::string& device, std::s
     if (!viewer) return std::nullopt;
     found = viewers_.emplace(device, *viewer).first;
   }
-  return "http://" + std::string(hostName(host)) + ":" + std::to_string(found->second.port) + "/";
+  return (tls_ ? "https://" : "http://") + std::string(hostName(host)) + ":" +
+         std::to_string(found->second.port) + "/";
 }
 
 std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& device,
@@ -96,6 +100,8 @@ std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& dev
   std::vector<std::string> arguments = {std::filesystem::read_symlink("/proc/self/exe").string(),
                                         "--service", service.text(), "--listen", listen};
   if (caFile_) arguments.insert(arguments.end(), {"--mqtt-ca", *caFile_});
+  if (tls_)
+    arguments.insert(arguments.end(), {"--tls-cert", tls_->certificate, "--tls-key", tls_->key});
   std::vector<char*> argv;
   for (std::string& argument : arguments)
     argv.push_back(argument.data());

@@ -14,14 +14,21 @@
 
 namespace app {
 
+// Where the certificate and key of HTTPS are, as --tls-cert and --tls-key give them.
+struct TlsFiles {
+  std::string certificate;
+  std::string key;
+};
+
 // The screens of the devices of a fleet, each shown by a viewer of its own: this program run as
 // `norvo --service mqtt://HOST/PREFIX/DEVICE --listen ADDRESS:PORT`, started when a device is
 // first opened and kept while it runs. The viewers end with this object, or with the process.
 class DeviceViewers {
  public:
-  // `broker`'s path is the prefix; viewers listen on `listen`, on ports the system picks.
+  // `broker`'s path is the prefix; viewers listen on `listen`, on ports the system picks, and
+  // serve HTTPS with `tls` when set.
   DeviceViewers(tarn::mqtt::BrokerAddress broker, std::optional<std::string> caFile,
-                boost::asio::ip::address listen);
+                boost::asio::ip::address listen, std::optional<TlsFiles> tls = std::nullopt);
   ~DeviceViewers();
   DeviceViewers(const DeviceViewers&) = delete;
   DeviceViewers& operator=(const DeviceViewers&) = delete;
@@ -43,6 +50,7 @@ class DeviceViewers {
   const tarn::mqtt::BrokerAddress broker_;
   const std::optional<std::string> caFile_;
   const boost::asio::ip::address listen_;
+  const std::optional<TlsFiles> tls_;
   std::mutex mutex_;
   std::map<std::string, Viewer> viewers_;
 };

@@ -21,7 +21,7 @@ namespace app {
 
 const std::string_view kFleetUsage =
     "usage: norvo --fleet mqtt[s]://[USER[:PASS]@]HOST[:PORT]/PREFIX [--listen ADDR:PORT]\n"
-    "             [--mqtt-ca FILE]\n"
+    "             [--mqtt-ca FILE] [--tls-cert FILE --tls-key FILE]\n"
     "\n"
     "Serves /fleet: every device that publishes under PREFIX (tarnd --publish), with its\n"
     "status, technology, network, serving cell, band, levels and the age of its last metric,\n"
@@ -30,6 +30,9 @@ const std::string_view kFleetUsage =
     "options:\n"
     "  --listen ADDR:PORT  where to serve the page (default 127.0.0.1:8080)\n"
     "  --mqtt-ca FILE      the certificate authority of an mqtts:// broker\n"
+    "  --tls-cert FILE     serve the page, and the devices' screens, over HTTPS with this\n"
+    "                      PEM certificate ...\n"
+    "  --tls-key FILE      ... and this PEM private key (docs/security.md)\n"
     "  --help              show this text\n";
 
 namespace {
@@ -44,14 +47,16 @@ struct FleetOptions {
   tarn::mqtt::BrokerAddress broker;
   std::optional<std::string> caFile;
   boost::asio::ip::tcp::endpoint listen{boost::asio::ip::make_address("127.0.0.1"), 8080};
+  std::optional<TlsFiles> tlsFiles;
+  std::shared_ptr<ui::web::TlsContext> tls;
 };
 
 std::optional<FleetOptions> parseFleetOptions(std::span<const std::string_view> arguments) {
-  std::optional<std::string_view> broker, listen, caFile;
+  std::optional<std::string_view> broker, listen, caFile, tlsCert, tlsKey;
   const platform::CommandLineOption table[] = {
-      {"--fleet", &broker, "a broker address"},
-      {"--listen", &listen, "an address and a port"},
-      {"--mqtt-ca", &caFile, "a certificate file"},
+      {"--fleet", &broker, "a broker address"},     {"--listen", &listen, "an address and a port"},
+      {"--mqtt-ca", &caFile, "a certificate file"}, {"--tls-cert", &tlsCert, "a certificate file"},
+      {"--tls-key", &tlsKey, "a private key file"},
   };
   const auto refuse = [](std::string_view why) -> std::optional<FleetOptions> {
     std::cerr << "norvo: " << why << "\n\n" << kFleetUsage;
@@ -72,6 +77,12 @@ std::optional<FleetOptions> parseFleetOptions(std::span<const std::string_view> 
     if (!endpoint) return refuse("--listen wants an address and a port, such as 127.0.0.1:8080");
     options.listen = *endpoint;
   }
+  try {
+    options.tls = ui::web::tlsContextOfOptions(tlsCert, tlsKey);
+  } catch (const std::runtime_error& error) {
+    return refuse(error.what());
+  }
+  if (options.tls) options.tlsFiles = TlsFiles{std::string(*tlsCert), std::string(*tlsKey)};
   return options;
 }
 
@@ -87,16 +98,19 @@ int runFleet(std::span<const std::string_view> arguments) {
   const std::string& prefix = options->broker.path;
 
   fleet::Fleet fleet(prefix);
-  DeviceViewers viewers(options->broker, options->caFile, options->listen.address());
+  DeviceViewers viewers(options->broker, options->caFile, options->listen.address(),
+                        options->tlsFiles);
   fleet::FleetSite site(fleet, &steadyMs, !options->listen.address().is_loopback(),
                         [&viewers](const std::string& device, std::string_view host,
                                    std::string& why) { return viewers.open(device, host, why); });
 
   boost::asio::io_context context(1);
   ui::web::Server server(
-      context, [&site](const ui::web::Request& request) { return site.handle(request); }, {});
+      context, [&site](const ui::web::Request& request) { return site.handle(request); }, {},
+      options->tls);
   if (const auto error = server.listen(options->listen)) {
-    std::cerr << "norvo: cannot listen on " << ui::web::browserAddress(options->listen) << ": "
+    std::cerr << "norvo: cannot listen on "
+              << ui::web::browserAddress(options->listen, options->tls != nullptr) << ": "
               << error.message() << '\n';
     return 1;
   }
@@ -126,7 +140,7 @@ int runFleet(std::span<const std::string_view> arguments) {
   }
 
   // Flushed, as scripts wait for it on a pipe.
-  std::cout << "Open " << ui::web::browserAddress(server.localEndpoint())
+  std::cout << "Open " << ui::web::browserAddress(server.localEndpoint(), options->tls != nullptr)
             << "fleet in a browser; Ctrl-C stops." << std::endl;
   boost::asio::signal_set signals(context, SIGINT, SIGTERM);
   signals.async_wait([&](const boost::system::error_code& error, int) {

@@ -26,16 +26,22 @@ std::optional<ServiceChoice> parseServiceChoice(std::string_view text) {
   return std::nullopt;
 }
 
-void useService(const ServiceChoice& choice, std::shared_ptr<tarn::service::MetricSource> source) {
+std::shared_ptr<const tarn::client::LinkStatus> useService(
+    const ServiceChoice& choice, std::shared_ptr<tarn::service::MetricSource> source) {
   if (choice.bus) {
-    tarn::client::useTransport(std::make_shared<tarn::dbus::BusTransport>(*choice.bus));
-  } else if (choice.broker) {
-    tarn::client::useTransport(std::make_shared<tarn::mqtt::MqttTransport>(
-        tarn::mqtt::RemoteDevice{*choice.broker, choice.caFile, "norvo"}));
-  } else {
-    tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(
-        std::make_shared<tarn::service::Core>(std::move(source))));
+    auto transport = std::make_shared<tarn::dbus::BusTransport>(*choice.bus);
+    tarn::client::useTransport(transport);
+    return transport->link();
   }
+  if (choice.broker) {
+    auto transport = std::make_shared<tarn::mqtt::MqttTransport>(
+        tarn::mqtt::RemoteDevice{*choice.broker, choice.caFile, "norvo"});
+    tarn::client::useTransport(transport);
+    return transport->link();
+  }
+  tarn::client::useTransport(std::make_shared<tarn::transport::InProcess>(
+      std::make_shared<tarn::service::Core>(std::move(source))));
+  return nullptr;
 }
 
 }  // namespace app

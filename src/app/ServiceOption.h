@@ -5,6 +5,7 @@
 #include <string>
 #include <string_view>
 
+#include "tarn/client/LinkStatus.h"
 #include "tarn/mqtt/BrokerAddress.h"
 #include "tarn/service/MetricSource.h"
 
@@ -34,7 +35,10 @@ extern const std::string_view kServiceChoices;
 std::optional<ServiceChoice> parseServiceChoice(std::string_view text);
 
 // Sessions opened from now on reach the chosen service; the one inside Norvo runs `source`.
-// Throws std::runtime_error when the MQTT library refuses the broker's options.
-void useService(const ServiceChoice& choice, std::shared_ptr<tarn::service::MetricSource> source);
+// Answers how the way to a service on a bus or behind a broker stands, or null for the one
+// inside Norvo, which is always there. Throws std::runtime_error when the MQTT library refuses
+// the broker's options.
+std::shared_ptr<const tarn::client::LinkStatus> useService(
+    const ServiceChoice& choice, std::shared_ptr<tarn::service::MetricSource> source);
 
 }  // namespace app

@@ -46,8 +46,8 @@ std::string statusText(const StatusFigures& figures, std::size_t width) {
 }
 
 StatusLine::StatusLine(std::FILE* terminal, std::string source, const series::SeriesStore& series)
-    : terminal_(terminal), series_(series) {
-  figures_.source = std::move(source);
+    : terminal_(terminal), series_(series), source_(std::move(source)) {
+  figures_.source = source_;
 }
 
 StatusLine::~StatusLine() {
@@ -78,6 +78,7 @@ void StatusLine::tick() {
   const std::size_t oldest = counted_[(ticks_ + counted_.size() - window) % counted_.size()];
   counted_[ticks_ % counted_.size()] = metrics_;
   ++ticks_;
+  figures_.source = link_ && !link_->get().connected ? source_ + " (not connected)" : source_;
   figures_.metricsPerSecond =
       window == 0 ? 0.0 : static_cast<double>(metrics_ - oldest) / static_cast<double>(window);
   figures_.serving = dashboard::servingLevel(series_);

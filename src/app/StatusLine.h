@@ -9,6 +9,7 @@
 
 #include "dashboard/ServingCell.h"
 #include "series/SeriesStore.h"
+#include "tarn/client/LinkStatus.h"
 #include "ui/Timer.h"
 
 namespace app {
@@ -40,6 +41,8 @@ class StatusLine {
   void metricStored() { ++metrics_; }
   // Where the number of alerts comes from, once alerts exist.
   void setAlertCount(std::function<std::size_t()> count) { alertCount_ = std::move(count); }
+  // Whether the service is reached: while it is not, the source says so.
+  void setLink(std::shared_ptr<const tarn::client::LinkStatus> link) { link_ = std::move(link); }
 
   // Shows the line now and then every second.
   void start();
@@ -55,6 +58,8 @@ class StatusLine {
   const series::SeriesStore& series_;
   StatusFigures figures_;
   std::function<std::size_t()> alertCount_;
+  const std::string source_;
+  std::shared_ptr<const tarn::client::LinkStatus> link_;
   std::size_t metrics_ = 0;
   // Metrics counted at each of the last ticks, for a rate over a few seconds.
   std::array<std::size_t, 5> counted_{};

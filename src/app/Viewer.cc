@@ -41,7 +41,8 @@
 namespace app {
 
 const std::string_view kViewerUsage =
-    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]] [--service WHERE]\n"
+    "usage: norvo [--listen ADDR:PORT [--token-file FILE | --no-auth]]\n"
+    "             [--tls-cert FILE --tls-key FILE] [--service WHERE]\n"
     "             [--log FILE] [--replay LOG.jsonl [--speed X] [--loop]] [--alerts FILE]\n"
     "             [--source modemmanager[:MODEM] [--refresh SECONDS]]\n"
     "\n"
@@ -58,6 +59,9 @@ const std::string_view kViewerUsage =
     "                      free port.\n"
     "  --token-file FILE   the access token to ask for, from FILE, instead of a new one\n"
     "  --no-auth           show the pages beyond loopback to anyone, with no token\n"
+    "  --tls-cert FILE     serve the pages over HTTPS with this PEM certificate (its chain\n"
+    "                      may follow it) ...\n"
+    "  --tls-key FILE      ... and this PEM private key (docs/security.md)\n"
     "  --service WHERE     the baseband service: \"builtin\" (the default) runs it inside\n"
     "                      Norvo; \"dbus\" reaches tarnd on the session bus, \"dbus:system\"\n"
     "                      or \"dbus:ADDRESS\" on another bus;\n"
@@ -111,7 +115,7 @@ std::nullopt_t refuse(std::string_view why) {
 // The arguments of the viewer, as given.
 struct GivenOptions {
   std::optional<std::string_view> listen, service, replay, speed, source, refresh, log, caFile,
-      alerts, tokenFile;
+      alerts, tokenFile, tlsCert, tlsKey;
   bool loop = false;
   bool noAuth = false;
 };
@@ -135,7 +139,7 @@ std::optional<std::string> readToken(std::string_view path) {
 // Empty, after saying why on standard error, when the values make no sense.
 std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
   const auto& [listen, service, replay, speed, source, refresh, log, caFile, alerts, tokenFile,
-               loop, noAuth] = given;
+               tlsCert, tlsKey, loop, noAuth] = given;
   ViewerOptions options;
   if (listen) {
     const auto endpoint = ui::web::parseListenAddress(*listen);
@@ -164,6 +168,11 @@ std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
         return refuse(error.what());
       }
     }
+  }
+  try {
+    options.display.tls = ui::web::tlsContextOfOptions(tlsCert, tlsKey);
+  } catch (const std::runtime_error& error) {
+    return refuse(error.what());
   }
   if (service) {
     const auto choice = parseServiceChoice(*service);
@@ -230,15 +239,22 @@ std::string sourceName(const ViewerOptions& options) {
   return "simulated phone";
 }
 
-// How the viewer keeps up: the events its session dropped because it fell behind, by kind.
-platform::Dictionary viewerStatus() {
+// How the viewer keeps up: the events its session dropped because it fell behind, by kind; and,
+// with a service on a bus or behind a broker, whether it is reached.
+platform::Dictionary viewerStatus(const tarn::client::LinkStatus* link) {
   platform::Dictionary dropped;
   std::uint64_t total = 0;
   for (const auto& [kind, count] : tarn::client::droppedEvents()) {
     dropped.append(tarn::flow::kindName(kind), count);
     total += count;
   }
-  return {{"dropped_events", total}, {"dropped_by_kind", std::move(dropped)}};
+  platform::Dictionary status = {{"dropped_events", total},
+                                 {"dropped_by_kind", std::move(dropped)}};
+  if (link) {
+    const auto [connected, text] = link->get();
+    status.append("service", platform::Dictionary{{"connected", connected}, {"status", text}});
+  }
+  return status;
 }
 
 }  // namespace
@@ -258,6 +274,8 @@ int runViewer(std::span<const std::string_view> arguments) {
       {"--alerts", &given.alerts, "an alerts file"},
       {"--token-file", &given.tokenFile, "a file name"},
       {"--no-auth", &given.noAuth},
+      {"--tls-cert", &given.tlsCert, "a certificate file"},
+      {"--tls-key", &given.tlsKey, "a private key file"},
   };
   if (const auto exit = platform::openCommandLine({"norvo", kViewerUsage}, arguments, table, {},
                                                   std::cout, std::cerr)) {
@@ -270,13 +288,14 @@ int runViewer(std::span<const std::string_view> arguments) {
   // Elsewhere, tarnd or the broker brings its own.
   std::shared_ptr<tarn::service::MetricSource> source;
   std::optional<player::Drive> drive;
+  std::shared_ptr<const tarn::client::LinkStatus> link;
   try {
     if (options->replayPath) {
       drive = player::readDrive(*options->replayPath, std::cerr);
     } else if (options->service.builtIn()) {
       source = builtInSource(*options);
     }
-    useService(options->service, std::move(source));
+    link = useService(options->service, std::move(source));
   } catch (const std::runtime_error& error) {
     std::cerr << "norvo: " << error.what() << '\n';
     return 1;
@@ -288,6 +307,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   const std::unique_ptr<ViewerOutput> output =
       ViewerOutput::open(options->log, sourceName(*options), levels);
   if (!output) return 1;
+  output->setLink(link);
 
   ui::DisplayOptions display = std::move(options->display);
   display.readings.emplace("store",
@@ -321,7 +341,7 @@ int runViewer(std::span<const std::string_view> arguments) {
   chrome.activeAlerts = [&alerts] { return alerts.active(); };
   if (replay) chrome.replayState = [&replay] { return replay->stateDictionary(); };
   chrome.addReading(display);
-  display.readings.emplace("status", [] { return platform::toJson(viewerStatus()); });
+  display.readings.emplace("status", [link] { return platform::toJson(viewerStatus(link.get())); });
   AppDelegate delegate;
   return ui::applicationMain(delegate, mainInterface(), std::move(display));
 }

@@ -57,6 +57,10 @@ void ViewerOutput::setAlertCount(std::function<std::size_t()> count) {
   if (statusLine_) statusLine_->setAlertCount(std::move(count));
 }
 
+void ViewerOutput::setLink(std::shared_ptr<const tarn::client::LinkStatus> link) {
+  if (statusLine_) statusLine_->setLink(std::move(link));
+}
+
 void ViewerOutput::wire(ui::DisplayOptions& display, store::MetricValidator& intake) {
   if (!statusLine_) return;
   StatusLine& statusLine = *statusLine_;

@@ -37,6 +37,8 @@ class ViewerOutput {
   void wire(ui::DisplayOptions& display, store::MetricValidator& intake);
   // Where the status line takes the number of alerts from, once alerts exist.
   void setAlertCount(std::function<std::size_t()> count);
+  // Whether the service is reached, for the status line.
+  void setLink(std::shared_ptr<const tarn::client::LinkStatus> link);
 
  private:
   ViewerOutput(std::FILE* logFile, std::unique_ptr<StatusLine> statusLine);

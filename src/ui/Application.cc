@@ -19,9 +19,10 @@ struct Running {
       : pages(mainInterface, {}),
         site(pages, {!display.listen.address().is_loopback(), std::move(display.readings),
                      std::move(display.queries), std::move(display.documents),
-                     std::move(display.routes), display.token}),
-        server(platform::mainQueue(),
-               [this](const web::Request& request) { return site.handle(request); }, {}),
+                     std::move(display.routes), display.token, display.tls != nullptr}),
+        server(
+            platform::mainQueue(),
+            [this](const web::Request& request) { return site.handle(request); }, {}, display.tls),
         signals(platform::mainQueue(), SIGINT, SIGTERM) {}
 
   web::OpenPages pages;
@@ -46,13 +47,15 @@ int applicationMain(ApplicationDelegate& delegate, const Storyboard& mainInterfa
 
     running = std::make_unique<Running>(mainInterface, display);
     if (const auto error = running->server.listen(display.listen)) {
-      platform::log::warningf("Cannot listen on %s: %s", web::browserAddress(display.listen),
+      platform::log::warningf("Cannot listen on %s: %s",
+                              web::browserAddress(display.listen, display.tls != nullptr),
                               error.message());
       status = 1;
       platform::stopMainQueue();
       return;
     }
-    std::string address = web::browserAddress(running->server.localEndpoint());
+    std::string address =
+        web::browserAddress(running->server.localEndpoint(), display.tls != nullptr);
     if (display.token) address += "?" + std::string(web::Access::kQueryKey) + "=" + *display.token;
     platform::log::plainf("Open %s in a browser; Ctrl-C stops.", address);
     if (display.didStartServing) display.didStartServing(address);

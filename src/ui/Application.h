@@ -11,6 +11,7 @@
 #include "ui/Storyboard.h"
 #include "ui/Window.h"
 #include "ui/web/Site.h"
+#include "ui/web/Tls.h"
 
 namespace ui {
 
@@ -44,6 +45,8 @@ struct DisplayOptions {
   // When set, every page and reading needs this access token; the address printed at start
   // carries it.
   std::optional<std::string> token;
+  // When set, the pages are served over HTTPS only, with this certificate and key.
+  std::shared_ptr<web::TlsContext> tls;
 };
 
 // Runs the application on the main queue until it is asked to stop: makes the window and its

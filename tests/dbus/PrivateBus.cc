@@ -81,9 +81,9 @@ class AddressPipe {
 
 }  // namespace
 
-PrivateBus::PrivateBus() {
+PrivateBus::PrivateBus(std::optional<std::filesystem::path> socket) {
   const std::filesystem::path configuration = folder_ / "bus.conf";
-  writeConfiguration(configuration, folder_ / "bus");
+  writeConfiguration(configuration, socket.value_or(folder_ / "bus"));
   AddressPipe pipe;
   daemon_ = std::make_unique<ChildProcess>(ChildProcess::Options{
       .arguments = {"dbus-daemon", "--config-file=" + configuration.string(), "--nofork",

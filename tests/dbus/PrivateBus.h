@@ -1,7 +1,9 @@
 #pragma once
 
 #include <chrono>
+#include <filesystem>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -14,8 +16,9 @@ namespace bustest {
 // everyone own every name and send everything, and is killed with this object.
 class PrivateBus {
  public:
-  // Throws std::runtime_error when the daemon does not start.
-  PrivateBus();
+  // Listens on `socket`, or on a socket in its own folder. Throws std::runtime_error when the
+  // daemon does not start.
+  explicit PrivateBus(std::optional<std::filesystem::path> socket = std::nullopt);
   ~PrivateBus();
   PrivateBus(const PrivateBus&) = delete;
   PrivateBus& operator=(const PrivateBus&) = delete;

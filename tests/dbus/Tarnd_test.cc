@@ -8,6 +8,7 @@
 #include <fstream>
 #include <set>
 #include <sstream>
+#include <thread>
 
 #include "Eventually.h"
 #include "Files.h"
@@ -16,7 +17,9 @@
 #include "RecordingSession.h"
 #include "Records.h"
 #include "TemporaryFolder.h"
+#include "platform/Log.h"
 #include "tarn/Names.h"
+#include "tarn/client/LinkStatus.h"
 #include "tarn/dbus/BusTransport.h"
 #include "tarn/dbus/Interface.h"
 #include "tarn/log/MetricLog.h"
@@ -129,6 +132,53 @@ TEST(ASessionWithTarnd, OpenedBeforeTheServiceStartsReceivesWhatItAskedForOnceIt
     EXPECT_EQ(integerAt(event.record, tarn::kKeyProfileID), 4);
   }
   EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0) << tarnd->standardError();
+}
+
+// Log lines that start with `start`.
+std::size_t linesStarting(const std::vector<std::string>& lines, std::string_view start) {
+  return static_cast<std::size_t>(
+      std::count_if(lines.begin(), lines.end(),
+                    [start](const std::string& line) { return line.starts_with(start); }));
+}
+
+TEST(ASessionOverABus, ReachesTheBusOnceItAppearsAndAgainEachTimeItComesBack) {
+  TemporaryFolder folder;
+  const std::filesystem::path socket = folder / "bus";
+  const platform::log::Capture log;
+  const auto link = std::make_shared<tarn::client::LinkStatus>();
+  tarn::dbus::BusTransport transport("unix:path=" + socket.string(),
+                                     {.first = 5ms, .longest = 40ms}, link);
+  RecordingSession session(transport);
+  ASSERT_TRUE(session.manager());
+  EXPECT_EQ(session.configure("profile 4\n" + std::string(kMeasurements)).status,
+            tarn::status::kServiceUnavailable);
+  EXPECT_FALSE(link->get().connected);
+  EXPECT_THAT(link->get().text, HasSubstr("cannot reach the bus"));
+  // Time for several attempts, each of which fails.
+  std::this_thread::sleep_for(100ms);
+
+  for (const std::string round : {"first", "second"}) {
+    auto bus = std::make_unique<PrivateBus>(socket);
+    auto tarnd = startTarnd(bus->address(), kSimulator, folder / round);
+    const std::size_t before = session.received().size();
+    const std::vector<ReceivedEvent> events = session.waitFor(before + 3);
+    ASSERT_GE(events.size(), before + 3) << round << ": " << tarnd->standardError();
+    for (auto event = events.begin() + static_cast<std::ptrdiff_t>(before); event != events.end();
+         ++event) {
+      EXPECT_TRUE(kMeasurementIds.contains(integerAt(event->record, tarn::kKeyMetricID)));
+      EXPECT_EQ(integerAt(event->record, tarn::kKeyProfileID), 4);
+    }
+    EXPECT_TRUE(eventually([&] { return link->get().connected; })) << link->get().text;
+
+    bus.reset();
+    EXPECT_EQ(tarnd->wait(10s), 1) << "tarnd leaves with its bus";
+    EXPECT_TRUE(eventually([&] { return !link->get().connected; })) << round;
+  }
+  // Said once per outage, not once per attempt.
+  const std::vector<std::string> problems = log.systemLines();
+  EXPECT_EQ(linesStarting(problems, "tarn::client: cannot reach the bus unix:path="), 1u);
+  EXPECT_EQ(linesStarting(problems, "tarn::client: lost the bus unix:path="), 2u);
+  EXPECT_EQ(linesStarting(log.plainLines(), "tarn::client: reached the bus unix:path="), 2u);
 }
 
 TEST(ATarnd, ReplaysALogReportingEachBrokenLineWithItsNumber) {

@@ -2,11 +2,7 @@
 // pauses, looping, and the simulator at its fastest. The assertions are on what must hold however
 // loaded the machine is: nothing lost where the source can be held back, memory within bounds,
 // every page answered, and a prompt end on SIGINT or SIGTERM.
-#include <arpa/inet.h>
 #include <gtest/gtest.h>
-#include <netinet/in.h>
-#include <sys/socket.h>
-#include <unistd.h>
 
 #include <boost/json/parse.hpp>
 #include <csignal>
@@ -16,6 +12,7 @@
 #include "ChildProcess.h"
 #include "Eventually.h"
 #include "Files.h"
+#include "LoopbackHttp.h"
 #include "TemporaryFolder.h"
 #include "tarn/log/MetricLog.h"
 #include "tarn/service/Configuration.h"
@@ -27,6 +24,8 @@ using namespace std::chrono_literals;
 using bustest::ChildProcess;
 using bustest::contentsOf;
 using bustest::eventually;
+using bustest::freePort;
+using bustest::get;
 
 constexpr std::uint64_t kStartMs = 1'700'000'000'000;
 // The bound that Norvo's resident memory must stay under, whatever the rate offered. Under
@@ -55,45 +54,6 @@ std::size_t writeDrive(const std::filesystem::path& path) {
     ++lines;
   }
   return lines;
-}
-
-// A port that was free a moment ago.
-int freePort() {
-  const int probe = ::socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  socklen_t length = sizeof address;
-  ::bind(probe, reinterpret_cast<sockaddr*>(&address), sizeof address);
-  ::getsockname(probe, reinterpret_cast<sockaddr*>(&address), &length);
-  ::close(probe);
-  return ntohs(address.sin_port);
-}
-
-// The body of GET `path` on the loopback port, or empty when no whole answer came within 5 s.
-std::optional<std::string> get(int port, const std::string& path) {
-  const int connection = ::socket(AF_INET, SOCK_STREAM, 0);
-  const timeval timeout{.tv_sec = 5, .tv_usec = 0};
-  ::setsockopt(connection, SOL_SOCKET, SO_RCVTIMEO, &timeout, sizeof timeout);
-  ::setsockopt(connection, SOL_SOCKET, SO_SNDTIMEO, &timeout, sizeof timeout);
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  address.sin_port = htons(static_cast<std::uint16_t>(port));
-  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  std::string answer;
-  if (::connect(connection, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0) {
-    const std::string request = "GET " + path + " HTTP/1.0\r\nHost: 127.0.0.1\r\n\r\n";
-    if (::send(connection, request.data(), request.size(), MSG_NOSIGNAL) ==
-        static_cast<ssize_t>(request.size())) {
-      char buffer[65536];
-      for (ssize_t got; (got = ::recv(connection, buffer, sizeof buffer, 0)) > 0;)
-        answer.append(buffer, static_cast<std::size_t>(got));
-    }
-  }
-  ::close(connection);
-  const std::size_t body = answer.find("\r\n\r\n");
-  if (!answer.starts_with("HTTP/1.") || body == std::string::npos) return std::nullopt;
-  return answer.substr(body + 4);
 }
 
 // The peak resident memory of a running process, from /proc.

@@ -1,288 +1,169 @@
 #include "tarn/dbus/BusTransport.h"
 
 #include <sdbus-c++/Error.h>
-#include <sdbus-c++/IProxy.h>
-#include <sdbus-c++/Types.h>
 
-#include <map>
-#include <set>
+#include <algorithm>
+#include <condition_variable>
+#include <mutex>
+#include <shared_mutex>
+#include <thread>
 
 #include "platform/Format.h"
 #include "platform/Log.h"
-#include "tarn/Names.h"
 #include "tarn/dbus/Bus.h"
-#include "tarn/dbus/Interface.h"
-#include "tarn/dbus/Loop.h"
-#include "tarn/dbus/Marshal.h"
+#include "tarn/dbus/BusConnection.h"
 
 namespace tarn::dbus {
 
 namespace {
 
-constexpr std::uint64_t kCallTimeoutMicroseconds = 5'000'000;
-
-const std::string kService(kBusName);
-
-CommandResult serviceGone(const std::string& reason) {
-  return {status::kServiceUnavailable, "the baseband manager service has gone away: " + reason};
-}
-
-class BusConnection final : public client::Connection {
+// A session that survives its bus: a BusConnection while the bus is reached, and a thread that
+// reaches it again, with backoff, whenever it is not.
+class RetryingConnection final : public client::Connection {
  public:
-  BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::string clientName,
-                client::EventSink sink);
-  ~BusConnection() override;
-  BusConnection(const BusConnection&) = delete;
-  BusConnection& operator=(const BusConnection&) = delete;
+  RetryingConnection(std::string bus, std::string clientName, client::EventSink sink,
+                     Backoff backoff, std::shared_ptr<client::LinkStatus> link)
+      : bus_(std::move(bus)),
+        clientName_(std::move(clientName)),
+        sink_(std::move(sink)),
+        backoff_(backoff),
+        link_(std::move(link)) {
+    // The first attempt is made before the session is handed out, so that a bus that is there
+    // serves the first command.
+    reach();
+    retrier_ = std::jthread([this](std::stop_token stop) { keepReaching(stop); });
+  }
 
   CommandResult perform(std::string_view command, const ipc::Object& input,
-                        ipc::Object& output) override;
-  void setEventsOn(bool on) override;
+                        ipc::Object& output) override {
+    const std::shared_lock lock(swap_);
+    if (live_) return live_->perform(command, input, output);
+    const std::lock_guard away(awayMutex_);
+    const CommandResult result = serviceGone(whyUnreached_);
+    wishes_.remember(command, input, result);
+    return result;
+  }
+
+  void setEventsOn(bool on) override {
+    const std::shared_lock lock(swap_);
+    if (live_) return live_->setEventsOn(on);
+    const std::lock_guard away(awayMutex_);
+    wishes_.eventsOn = on;
+  }
 
  private:
-  void release();
-  // The members below run on the loop thread.
-  void subscribeAndOpen();
-  bool openSession();
-  void sessionLost(const std::string& reason);
-  CommandResult performOnLoop(std::string_view command, const ipc::Object& input);
-  CommandResult callPerformCommand(std::string_view command, const ipc::Object& input);
-  void noteFailedCall(const sdbus::Error& error);
-  void callSetEventsOn();
-  void remember(std::string_view command, const ipc::Object& input, const CommandResult& result);
-  void receiveEvents(sdbus::Message& signal);
-  void serviceOwnerChanged(sdbus::Message& signal);
+  // One attempt to reach the bus; true when it was reached. Commands wait meanwhile, so that
+  // none lands between two connections and is forgotten.
+  bool reach() {
+    const std::unique_lock lock(swap_);
+    try {
+      live_ = std::make_unique<BusConnection>(connectToBus(bus_), clientName_, sink_, wishes_,
+                                              link_, [this] {
+                                                {
+                                                  const std::lock_guard wake(wakeMutex_);
+                                                  busLost_ = true;
+                                                }
+                                                wake_.notify_all();
+                                              });
+    } catch (const sdbus::Error& error) {
+      whyUnreached_ = error.getMessage();
+      link_->set(false, "cannot reach the bus " + bus_ + " (" + whyUnreached_ + "); trying again");
+      return false;
+    }
+    return true;
+  }
 
+  // Takes the session's wishes from a connection whose bus has gone, and lets it go.
+  void dropLost() {
+    const std::unique_lock lock(swap_);
+    wishes_ = live_->wishes();
+    live_.reset();
+    whyUnreached_ = "the connection to the bus broke";
+  }
+
+  void keepReaching(std::stop_token stop) {
+    std::chrono::milliseconds delay = backoff_.first;
+    bool saidFailure = false;
+    // A session that did reach its bus at first said so already.
+    if (!hasLive()) sayFailure(saidFailure);
+    while (!stop.stop_requested()) {
+      if (hasLive()) {
+        {
+          std::unique_lock lock(wakeMutex_);
+          if (!wake_.wait(lock, stop, [this] { return busLost_; })) return;
+          busLost_ = false;
+        }
+        dropLost();
+        platform::log::warningf("tarn::client: lost the bus %s; trying again", bus_);
+        saidFailure = true;
+        delay = backoff_.first;
+      }
+      {
+        std::unique_lock lock(wakeMutex_);
+        wake_.wait_for(lock, stop, delay, [] { return false; });
+      }
+      if (stop.stop_requested()) return;
+      if (reach()) {
+        if (saidFailure) platform::log::plainf("tarn::client: reached the bus %s", bus_);
+        saidFailure = false;
+      } else {
+        sayFailure(saidFailure);
+        delay = std::min(delay * 2, backoff_.longest);
+      }
+    }
+  }
+
+  // The first failure in a row only.
+  void sayFailure(bool& said) {
+    if (said) return;
+    said = true;
+    const std::shared_lock lock(swap_);
+    platform::log::warningf(
+        "tarn::client: cannot reach the bus %s: %s; trying again every %.2f s at first, then "
+        "up to every %.0f s",
+        bus_, whyUnreached_, std::chrono::duration<double>(backoff_.first).count(),
+        std::chrono::duration<double>(backoff_.longest).count());
+  }
+
+  bool hasLive() {
+    const std::shared_lock lock(swap_);
+    return live_ != nullptr;
+  }
+
+  const std::string bus_;
   const std::string clientName_;
   const client::EventSink sink_;
+  const Backoff backoff_;
+  const std::shared_ptr<client::LinkStatus> link_;
 
-  std::unique_ptr<sdbus::IProxy> manager_;
-  // Empty while there is no session with the service.
-  std::unique_ptr<sdbus::IProxy> session_;
-  // The unique bus name of the service that opened the session.
-  std::string serviceOwner_;
-  std::string whyNoSession_;
-  sdbus::Slot ownerChanges_;
-  sdbus::Slot events_;
-  // What the session is to be like: the configuration last pushed for each app ID, and whether
-  // its events are on. A session opened again is made like this.
-  std::map<std::int64_t, ipc::Object> configurations_;
-  bool eventsOn_ = false;
-  // Last, so that its thread starts once every member it may touch is there.
-  Loop loop_;
+  // Commands hold it shared; reaching the bus and letting a connection go hold it alone.
+  std::shared_mutex swap_;
+  std::unique_ptr<BusConnection> live_;
+  // While there is no connection: what the session is to be like, and why. Commands change them
+  // holding `swap_` shared and `awayMutex_`.
+  std::mutex awayMutex_;
+  SessionWishes wishes_;
+  std::string whyUnreached_;
+
+  std::mutex wakeMutex_;
+  bool busLost_ = false;
+  std::condition_variable_any wake_;
+  // Last, so that its thread starts once every member it may touch is there, and is stopped and
+  // joined before any goes.
+  std::jthread retrier_;
 };
-
-BusConnection::BusConnection(std::unique_ptr<sdbus::IConnection> bus, std::string clientName,
-                             client::EventSink sink)
-    : clientName_(std::move(clientName)),
-      sink_(std::move(sink)),
-      loop_(std::move(bus), [this](const std::string& reason) {
-        sessionLost("the bus connection broke: " + reason);
-      }) {
-  try {
-    loop_.call([this] { subscribeAndOpen(); });
-  } catch (...) {
-    release();
-    throw;
-  }
-}
-
-void BusConnection::subscribeAndOpen() {
-  sdbus::IConnection& connection = loop_.connection();
-  manager_ = sdbus::createProxy(connection, kService, std::string(kManagerPath));
-  ownerChanges_ = connection.addMatch(
-      platform::format("type='signal',sender='org.freedesktop.DBus',"
-                       "interface='org.freedesktop.DBus',member='NameOwnerChanged',arg0='%s'",
-                       kBusName),
-      [this](sdbus::Message& signal) { serviceOwnerChanged(signal); });
-  events_ = connection.addMatch(platform::format("type='signal',interface='%s',member='%s'",
-                                                 kSessionInterface, kEventsSignal),
-                                [this](sdbus::Message& signal) { receiveEvents(signal); });
-  if (!openSession()) {
-    platform::log::warningf(
-        "tarn::client: the baseband manager service %s is not on the bus (%s); the session "
-        "opens when it comes",
-        kBusName, whyNoSession_);
-  }
-}
-
-BusConnection::~BusConnection() {
-  loop_.call([this] {
-    if (!session_) return;
-    try {
-      sdbus::MethodCall close =
-          session_->createMethodCall(kSessionInterfaceName, std::string(kClose));
-      close.dontExpectReply();
-      session_->callMethod(close);
-    } catch (const sdbus::Error&) {
-      // The service has gone, and the session with it.
-    }
-  });
-  release();
-}
-
-void BusConnection::release() {
-  loop_.stop();
-  // The loop has ended, so what it used may go on this thread, before the connection.
-  events_.reset();
-  ownerChanges_.reset();
-  session_.reset();
-  manager_.reset();
-}
-
-CommandResult BusConnection::perform(std::string_view command, const ipc::Object& input,
-                                     ipc::Object& /*output*/) {
-  return loop_.call([&] { return performOnLoop(command, input); });
-}
-
-void BusConnection::setEventsOn(bool on) {
-  loop_.call([this, on] {
-    eventsOn_ = on;
-    if (session_) callSetEventsOn();
-  });
-}
-
-bool BusConnection::openSession() {
-  try {
-    sdbus::MethodCall open =
-        manager_->createMethodCall(kManagerInterfaceName, std::string(kOpenSession));
-    open << clientName_;
-    sdbus::MethodReply reply = manager_->callMethod(open, kCallTimeoutMicroseconds);
-    sdbus::ObjectPath path;
-    reply >> path;
-    serviceOwner_ = reply.getSender();
-    session_ = sdbus::createProxy(loop_.connection(), kService, path);
-  } catch (const sdbus::Error& error) {
-    whyNoSession_ = error.getMessage();
-    return false;
-  }
-  for (const auto& [appId, input] : configurations_) {
-    const CommandResult result = callPerformCommand(kCommandAddConfiguration, input);
-    if (result.status != status::kSuccess) {
-      platform::log::systemf(
-          "tarn::client: the configuration of app %lld was refused again: error=%d msg=%s", appId,
-          result.status, result.message);
-    }
-  }
-  if (eventsOn_ && session_) callSetEventsOn();
-  return session_ != nullptr;
-}
-
-void BusConnection::sessionLost(const std::string& reason) {
-  if (!session_) return;
-  session_.reset();
-  serviceOwner_.clear();
-  whyNoSession_ = reason;
-  platform::log::warningf("tarn::client: lost the session with the baseband manager service (%s)",
-                          reason);
-}
-
-void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
-  std::string name, oldOwner, newOwner;
-  try {
-    signal >> name >> oldOwner >> newOwner;
-  } catch (const sdbus::Error&) {
-    return;  // not what the bus sends
-  }
-  if (!oldOwner.empty() && oldOwner == serviceOwner_) sessionLost("it left the bus");
-  if (newOwner.empty() || session_) return;
-  if (openSession()) {
-    platform::log::warningf(
-        "tarn::client: the baseband manager service is back; session opened again with %zu "
-        "configuration(s)",
-        configurations_.size());
-  }
-}
-
-CommandResult BusConnection::performOnLoop(std::string_view command, const ipc::Object& input) {
-  const CommandResult result =
-      session_ || openSession() ? callPerformCommand(command, input) : serviceGone(whyNoSession_);
-  remember(command, input, result);
-  return result;
-}
-
-CommandResult BusConnection::callPerformCommand(std::string_view command,
-                                                const ipc::Object& input) {
-  // a{sv} cannot say that the arguments were no dictionary at all.
-  if (!input.isDictionary()) {
-    return {status::kInvalidArgument, "the command's arguments are not a dictionary"};
-  }
-  try {
-    sdbus::MethodCall call =
-        session_->createMethodCall(kSessionInterfaceName, std::string(kPerformCommand));
-    call << std::string(command);
-    appendRecord(call, input);
-    sdbus::MethodReply reply = session_->callMethod(call, kCallTimeoutMicroseconds);
-    CommandResult result;
-    reply >> result.status >> result.message;
-    return result;
-  } catch (const MalformedRecord& error) {
-    return {status::kInvalidArgument,
-            platform::format("the arguments cannot travel on D-Bus: %s", error.what())};
-  } catch (const sdbus::Error& error) {
-    noteFailedCall(error);
-    return serviceGone(error.getMessage());
-  }
-}
-
-void BusConnection::noteFailedCall(const sdbus::Error& error) {
-  // A service that is slow to answer keeps the session; one that has left or forgotten it does
-  // not.
-  static const std::set<std::string, std::less<>> kSessionGone = {
-      "org.freedesktop.DBus.Error.ServiceUnknown", "org.freedesktop.DBus.Error.NameHasNoOwner",
-      "org.freedesktop.DBus.Error.UnknownObject", "org.freedesktop.DBus.Error.Disconnected"};
-  if (kSessionGone.contains(error.getName())) sessionLost(error.getMessage());
-}
-
-void BusConnection::callSetEventsOn() {
-  try {
-    sdbus::MethodCall call =
-        session_->createMethodCall(kSessionInterfaceName, std::string(kSetEventsOn));
-    call << eventsOn_;
-    session_->callMethod(call, kCallTimeoutMicroseconds);
-  } catch (const sdbus::Error& error) {
-    noteFailedCall(error);
-  }
-}
-
-// A configuration pushed while the service is away is pushed when it comes.
-void BusConnection::remember(std::string_view command, const ipc::Object& input,
-                             const CommandResult& result) {
-  if (result.status != status::kSuccess && result.status != status::kServiceUnavailable) return;
-  const ipc::Object* appId = input.find(kKeyAppID);
-  if (appId == nullptr || appId->asInteger() == nullptr) return;
-  if (command == kCommandAddConfiguration) {
-    configurations_.insert_or_assign(*appId->asInteger(), input);
-  } else if (command == kCommandClearConfiguration) {
-    configurations_.erase(*appId->asInteger());
-  }
-}
-
-void BusConnection::receiveEvents(sdbus::Message& signal) {
-  if (!session_ || signal.getPath() != session_->getObjectPath() ||
-      signal.getSender() != serviceOwner_) {
-    return;
-  }
-  try {
-    for (Event& event : readEvents(signal))
-      sink_(event.name, std::move(event.record));
-  } catch (const MalformedRecord& error) {
-    platform::log::systemf("tarn::client: events that do not read dropped: %s", error.what());
-  }
-}
 
 }  // namespace
 
-BusTransport::BusTransport(std::string bus) : bus_(std::move(bus)) {}
+BusTransport::BusTransport(std::string bus, Backoff backoff,
+                           std::shared_ptr<client::LinkStatus> link)
+    : bus_(std::move(bus)),
+      backoff_(backoff),
+      link_(link ? std::move(link) : std::make_shared<client::LinkStatus>()) {}
 
 std::unique_ptr<client::Connection> BusTransport::connect(const std::string& clientName,
                                                           client::EventSink sink) {
-  try {
-    return std::make_unique<BusConnection>(connectToBus(bus_), clientName, std::move(sink));
-  } catch (const sdbus::Error& error) {
-    platform::log::warningf("tarn::client: cannot reach the bus %s: %s", bus_, error.getMessage());
-    return nullptr;
-  }
+  return std::make_unique<RetryingConnection>(bus_, clientName, std::move(sink), backoff_, link_);
 }
 
 }  // namespace tarn::dbus

@@ -56,6 +56,8 @@ void ModemManagerSource::run(std::stop_token stop,
                              const std::function<void(service::Metric)>& deliver) {
   std::unique_ptr<Follower> follower;
   std::string lastFailure;
+  // Whether the bus was lost or could not be reached since it last was.
+  bool away = false;
   Follower::Hooks hooks{
       .deliver = deliver,
       .simFiles =
@@ -72,13 +74,19 @@ void ModemManagerSource::run(std::stop_token stop,
   std::mutex sleeping;
   std::unique_lock lock(sleeping);
   do {
-    if (follower && follower->lost()) follower.reset();
+    if (follower && follower->lost()) {
+      follower.reset();
+      away = true;
+    }
     if (!follower) {
       try {
         follower =
             std::make_unique<Follower>(tarn::dbus::connectToBus(options_.bus), options_, hooks);
+        if (away) status_("reached the " + options_.bus + " bus again");
+        away = false;
         lastFailure.clear();
       } catch (const sdbus::Error& error) {
+        away = true;
         const std::string failure =
             "cannot reach the " + options_.bus + " bus: " + error.getMessage() + "; trying again";
         if (failure != lastFailure) status_(failure);

@@ -23,6 +23,7 @@ class MqttTransport final : public client::Transport {
                                               client::EventSink sink) override;
 
   const RemoteSource& device() const { return *source_; }
+  const std::shared_ptr<client::LinkStatus>& link() const { return source_->link(); }
 
  private:
   std::shared_ptr<RemoteSource> source_;

@@ -75,11 +75,17 @@ void RemoteSource::start(std::function<void(service::Metric)> deliver) {
   options.caFile = device_.caFile;
   options.subscriptions = {metricsTopic_, statusTopic_, latestTopics_ + "+"};
   options.name = device_.name;
+  const std::string broker = device_.broker.endpoint();
+  brokerLink_->set(false, "connecting to the broker at " + broker);
   link_ = std::make_unique<Link>(
       std::move(options),
       Link::Handlers{
-          .connected = {},
-          .disconnected = {},
+          .connected = [this,
+                        broker] { brokerLink_->set(true, "connected to the broker at " + broker); },
+          .disconnected =
+              [this, broker] {
+                brokerLink_->set(false, "lost the broker at " + broker + "; trying again");
+              },
           .published = {},
           .message = [this](std::string_view topic,
                             std::string_view payload) { receive(topic, payload); },

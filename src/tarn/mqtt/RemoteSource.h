@@ -10,6 +10,7 @@
 #include <string>
 #include <string_view>
 
+#include "tarn/client/LinkStatus.h"
 #include "tarn/mqtt/BrokerAddress.h"
 #include "tarn/mqtt/Link.h"
 #include "tarn/service/MetricSource.h"
@@ -61,6 +62,8 @@ class RemoteSource final : public service::MetricSource {
 
   DeviceStatus status() const;
   std::uint64_t refused() const;
+  // Whether the broker is reached, said when it is and when it is lost.
+  const std::shared_ptr<client::LinkStatus>& link() const { return brokerLink_; }
 
  private:
   void receive(std::string_view topic, std::string_view payload);
@@ -76,6 +79,7 @@ class RemoteSource final : public service::MetricSource {
   DeviceStatus status_;
   std::uint64_t refused_ = 0;
 
+  const std::shared_ptr<client::LinkStatus> brokerLink_ = std::make_shared<client::LinkStatus>();
   std::unique_ptr<Link> link_;
 };
 

@@ -59,7 +59,7 @@ std::optional<std::string_view> cookieValue(const Request& request, std::string_
 
 }  // namespace
 
-Access::Access(std::string token) : token_(std::move(token)) {}
+Access::Access(std::string token, bool secure) : token_(std::move(token)), secure_(secure) {}
 
 // Compares every byte whatever the first difference, so that the time taken tells nothing.
 bool Access::matches(std::string_view candidate) const {
@@ -81,9 +81,9 @@ std::optional<Response> Access::check(const Request& request) const {
       std::string location(target.substr(0, question));
       if (!given.rest.empty()) location += "?" + given.rest;
       response.set(http::field::location, location);
-      response.set(
-          http::field::set_cookie,
-          platform::format("%s=%s; HttpOnly; SameSite=Strict; Path=/", kCookieName, token_));
+      response.set(http::field::set_cookie,
+                   platform::format("%s=%s; HttpOnly; SameSite=Strict; Path=/%s", kCookieName,
+                                    token_, secure_ ? "; Secure" : ""));
       return response;
     }
   }

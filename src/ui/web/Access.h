@@ -11,14 +11,15 @@ namespace ui::web {
 // Who may look when the pages are shown beyond this machine: whoever holds the secret token. A
 // browser brings it once in the address (/?token=...); the answer sets a cookie that carries it
 // from then on (HttpOnly, so scripts cannot read it; SameSite=Strict, so other sites cannot send
-// it) and sends the browser on to the same address without the token, out of its history.
+// it; Secure too when the pages are served over HTTPS, so that it never travels in the clear) and
+// sends the browser on to the same address without the token, out of its history.
 class Access {
  public:
   static constexpr std::string_view kQueryKey = "token";
   static constexpr std::string_view kCookieName = "norvo_token";
 
-  // `token` is not empty.
-  explicit Access(std::string token);
+  // `token` is not empty. `secure`: the pages are served over HTTPS.
+  explicit Access(std::string token, bool secure = false);
 
   // Empty when `request` may have its answer. Otherwise the answer instead: a redirect that sets
   // the cookie, or 401 with a short page that says how to get in.
@@ -32,6 +33,7 @@ class Access {
   bool matches(std::string_view candidate) const;
 
   const std::string token_;
+  const bool secure_;
 };
 
 }  // namespace ui::web

@@ -30,7 +30,7 @@ std::optional<boost::asio::ip::tcp::endpoint> parseListenAddress(std::string_vie
   return boost::asio::ip::tcp::endpoint(address, port);
 }
 
-std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint) {
+std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint, bool tls) {
   const auto address = endpoint.address();
   std::string host;
   if (address.is_unspecified())
@@ -39,7 +39,7 @@ std::string browserAddress(const boost::asio::ip::tcp::endpoint& endpoint) {
     host = "[" + address.to_string() + "]";
   else
     host = address.to_string();
-  return "http://" + host + ":" + std::to_string(endpoint.port()) + "/";
+  return (tls ? "https://" : "http://") + host + ":" + std::to_string(endpoint.port()) + "/";
 }
 
 bool isLoopbackHost(std::string_view host) {

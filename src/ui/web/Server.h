@@ -8,11 +8,17 @@
 #include <memory>
 
 #include "ui/web/Http.h"
+#include "ui/web/Tls.h"
 
 namespace ui::web {
 
+namespace serving {
+struct Shared;
+}
+
 // An HTTP/1.1 server on one io_context: it reads each request within bounds, hands it to
-// `handler` on that io_context and writes the answer back.
+// `handler` on that io_context and writes the answer back. With a TLS context it speaks HTTPS
+// only: a connection that does not shake hands within the read timeout is closed.
 class Server {
  public:
   using Handler = std::function<Response(const Request&)>;
@@ -33,7 +39,8 @@ class Server {
     std::size_t keptForLoopback = 32;
   };
 
-  Server(boost::asio::io_context& context, Handler handler, Limits limits);
+  Server(boost::asio::io_context& context, Handler handler, Limits limits,
+         std::shared_ptr<TlsContext> tls = nullptr);
   // Stops, as stop() does.
   ~Server();
   Server(const Server&) = delete;
@@ -49,13 +56,11 @@ class Server {
   std::size_t openConnections() const;
 
  private:
-  class Connection;
-  struct Shared;
-
   void accept();
 
   boost::asio::ip::tcp::acceptor acceptor_;
-  std::shared_ptr<Shared> shared_;
+  std::shared_ptr<serving::Shared> shared_;
+  const std::shared_ptr<TlsContext> tls_;
 };
 
 }  // namespace ui::web

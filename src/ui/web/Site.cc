@@ -34,7 +34,7 @@ Response error(const Request& request, http::status status, ErrorFormat format) 
 }  // namespace
 
 Site::Site(OpenPages& pages, Options options) : pages_(pages), options_(std::move(options)) {
-  if (options_.token) access_.emplace(*options_.token);
+  if (options_.token) access_.emplace(*options_.token, options_.secure);
 }
 
 Response Site::handle(const Request& request) {

@@ -61,6 +61,8 @@ class Site {
     std::map<std::string, Route, std::less<>> routes;
     // When set, every answer needs this access token (see Access.h).
     std::optional<std::string> token = std::nullopt;
+    // The pages are served over HTTPS, so the token's cookie travels only there.
+    bool secure = false;
   };
 
   Site(OpenPages& pages, Options options);

@@ -4,17 +4,18 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <ranges>
 #include <span>
 
+#include "StoreValues.h"
 #include "codec/Codable.h"
-#include "store/StoreDump.h"
 #include "store/StoreTesting.h"
 #include "tarn/mm/Metrics.h"
 #include "tarn/mm/Reading.h"
 
 namespace {
 
+using mmtest::Shown;
+using mmtest::shownAt;
 using platform::Dictionary;
 using platform::List;
 using store::MetricValidator;
@@ -47,29 +48,6 @@ Cell cell(Rat rat, bool serving) {
   cell.serving = serving;
   return cell;
 }
-
-// The number the store shows at `path`: keys of its dump joined by '/', taking the first row of
-// a list.
-std::optional<double> shownAt(const MetricValidator& store, std::string_view path) {
-  platform::Value value = store::dumpStore(store);
-  for (const auto part : std::views::split(path, '/')) {
-    const List* list = value.asList();
-    const platform::Value& whole = list != nullptr && !list->empty() ? list->at(0) : value;
-    const Dictionary* dictionary = whole.asDictionary();
-    const platform::Value* found =
-        dictionary != nullptr ? dictionary->find(std::string_view(part.begin(), part.end()))
-                              : nullptr;
-    if (found == nullptr) return std::nullopt;
-    value = platform::Value(*found);  // a copy: `found` lies within `value`
-  }
-  return value.asDouble();
-}
-
-// Values as the store shows them after the intake.
-struct Shown {
-  std::string_view path;
-  double expected;
-};
 
 void expectShown(const MetricValidator& store, std::span<const Shown> values) {
   for (const Shown& value : values)

@@ -9,7 +9,8 @@ const net = require('node:net');
 const os = require('node:os');
 const path = require('node:path');
 const { after, before, test } = require('node:test');
-const { freePort, startBrowser, startProgram, screenshot, program } = require('./norvo.js');
+const { freePort, openPage, program, screenshot, startBrowser, startProgram, stopCleanly } =
+  require('./norvo.js');
 
 const fleetSim = process.env.NORVO_FLEET_SIM ??
     path.join(path.dirname(program), '..', '..', 'tools', 'fleetsim', 'norvo-fleet-sim');
@@ -54,11 +55,7 @@ before(async () => {
 
 after(async () => {
   await browser?.close();
-  if (fleet) {
-    const { code, signal } = await fleet.stop();
-    assert.equal(signal, null, 'norvo --fleet was killed instead of stopping');
-    assert.equal(code, 0, 'norvo --fleet did not stop cleanly');
-  }
+  if (fleet) await stopCleanly(fleet, 'norvo --fleet');
   devices?.kill('SIGKILL');
   broker?.kill('SIGKILL');
   fs.rmSync(folder, { recursive: true, force: true });
@@ -69,9 +66,7 @@ const column = (page, index) =>
   page.locator(`#fleet tbody tr td:nth-child(${index})`).allTextContents();
 
 test('lists every device live, sorts, filters and opens a device\'s own screens', async () => {
-  const page = await browser.context.newPage();
-  const problems = [];
-  page.on('pageerror', (error) => problems.push(error.message));
+  const { page, problems } = await openPage(browser);
   await page.setViewportSize({ width: 1280, height: 900 });
   await page.goto(address + '/fleet');
 

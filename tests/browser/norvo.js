@@ -93,10 +93,10 @@ function startProgram(args, addressLine) {
 }
 
 // Stops Norvo as Ctrl-C would and checks that it ended cleanly.
-async function stopCleanly(norvo) {
+async function stopCleanly(norvo, name = 'norvo') {
   const { code, signal } = await norvo.stop();
-  assert.equal(signal, null, 'norvo was killed instead of stopping');
-  assert.equal(code, 0, 'norvo did not stop cleanly');
+  assert.equal(signal, null, `${name} was killed instead of stopping`);
+  assert.equal(code, 0, `${name} did not stop cleanly`);
 }
 
 async function startBrowser() {
@@ -136,18 +136,24 @@ async function openPage(browser) {
   return { page, problems };
 }
 
-// A Norvo with `args` and a browser for the tests of one file, stopped cleanly after them; the
-// answer holds `address` and `browser` once the tests run.
-function norvoForTheseTests(args = []) {
+// A Norvo and a browser for the tests of one file, stopped cleanly after them; the answer holds
+// `address` and `browser` once the tests run. `args` may be a function of a scratch folder,
+// removed after the tests, that prepares what Norvo reads; `port` as startNorvo takes it.
+function norvoForTheseTests(args = [], { port } = {}) {
   const suite = {};
   before(async () => {
-    suite.norvo = startNorvo(args);
+    if (typeof args === 'function') {
+      suite.folder = fs.mkdtempSync(path.join(os.tmpdir(), 'norvo-test-'));
+      args = await args(suite.folder);
+    }
+    suite.norvo = startNorvo(args, { port: port && await freePort() });
     suite.address = await suite.norvo.address;
     suite.browser = await startBrowser();
   });
   after(async () => {
     await suite.browser?.close();
     if (suite.norvo) await stopCleanly(suite.norvo);
+    if (suite.folder) fs.rmSync(suite.folder, { recursive: true, force: true });
   });
   return suite;
 }

@@ -5,18 +5,13 @@
 const assert = require('node:assert/strict');
 const { spawnSync } = require('node:child_process');
 const fs = require('node:fs');
-const os = require('node:os');
 const path = require('node:path');
-const { after, before, test } = require('node:test');
-const { program, freePort, startBrowser, startNorvo, openPage, screenshot, stopCleanly } = require('./norvo.js');
+const { test } = require('node:test');
+const { program, norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
 
-let folder;
-let norvo;
-let browser;
-let address;
-
-before(async () => {
-  folder = fs.mkdtempSync(path.join(os.tmpdir(), 'norvo-timeline-'));
+// A replay at full speed may hold the line that names its address in its output: given a port,
+// it is found by asking.
+const suite = norvoForTheseTests((folder) => {
   const drive = path.join(folder, 'drive.jsonl');
   // Three minutes of the drive: out of the city centre and through the underpass.
   const recorded = spawnSync(program, ['record', drive, '--seconds', '3', '--speed', '60'], {
@@ -26,20 +21,10 @@ before(async () => {
   const alerts = path.join(folder, 'alerts.toml');
   // An alert that any LTE level sets off at once, so that the banner shows while on LTE.
   fs.writeFileSync(alerts, '[[alert]]\nname = "On LTE"\nseries = "lte.rsrp"\nabove = -1000\n');
-  norvo = startNorvo(['--replay', drive, '--speed', 'max', '--alerts', alerts], { port: await freePort() });
-  address = await norvo.address;
-  browser = await startBrowser();
-});
+  return ['--replay', drive, '--speed', 'max', '--alerts', alerts];
+}, { port: true });
 
-after(async () => {
-  await browser?.close();
-  if (norvo) {
-    await stopCleanly(norvo);
-  }
-  if (folder) fs.rmSync(folder, { recursive: true, force: true });
-});
-
-const newPage = () => openPage(browser);
+const newPage = () => openPage(suite.browser);
 
 async function replayState(page) {
   return page.evaluate(async () => (await fetch('/api/replay')).json());
@@ -47,10 +32,10 @@ async function replayState(page) {
 
 test('lists what happened, failures first to the eye, and shows the metric behind one', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/');
+  await page.goto(suite.address + '/');
   assert.deepEqual(await page.locator('main .row .text').allTextContents(), ['Device Info', 'LTE', 'UMTS', 'GSM']);
   await page.locator('.bar .links').getByRole('link', { name: 'Timeline' }).click();
-  await page.waitForURL(address + '/timeline');
+  await page.waitForURL(suite.address + '/timeline');
 
   const failure = page.locator('.event.failure', { hasText: 'radio link failure' }).first();
   await failure.waitFor({ timeout: 20000 });
@@ -79,7 +64,7 @@ test('lists what happened, failures first to the eye, and shows the metric behin
 
 test('puts a player bar beside the tables that plays, pauses and seeks', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/LTE');
+  await page.goto(suite.address + '/LTE');
   const player = page.locator('.player');
   await player.waitFor();
   assert.equal(await page.locator('main .row').count(), 14, 'the table changed');
@@ -112,7 +97,7 @@ test('puts a player bar beside the tables that plays, pauses and seeks', async (
 
 test('shows active alerts as a banner above the tables, and their events', async () => {
   const { page, problems } = await newPage();
-  await page.goto(address + '/LTE');
+  await page.goto(suite.address + '/LTE');
   // A moment on LTE, before the underpass.
   await page.evaluate(async () => {
     const state = await (await fetch('/api/replay')).json();

@@ -79,4 +79,11 @@ inline FakeModemManager::Modem lteModem(std::string_view imei) {
   };
 }
 
+// Modem `index`: a registered LTE modem of `imei` serving on PCI `pci`, alone.
+inline void addServingModem(FakeModemManager& fake, unsigned index, std::string_view imei,
+                            std::uint32_t pci, std::uint32_t earfcn = 1300) {
+  fake.addModem(index, lteModem(imei));
+  fake.setCells(index, {lteCell(true, pci, earfcn, -97, -11)});
+}
+
 }  // namespace mmtest

@@ -11,6 +11,7 @@
 
 #include "FakeModemManager.h"
 #include "PrivateBus.h"
+#include "StoreValues.h"
 #include "Tarnd.h"
 #include "TemporaryFolder.h"
 #include "app/ServiceOption.h"
@@ -26,28 +27,10 @@ namespace mmtest {
 namespace {
 
 using namespace std::chrono_literals;
-using platform::Dictionary;
 using store::MetricValidator;
 namespace mm = tarn::mm;
 
 constexpr auto kStepTimeout = 20s;
-
-std::optional<double> numberIn(const std::optional<Dictionary>& dictionary, std::string_view key) {
-  if (!dictionary) return std::nullopt;
-  const platform::Value* value = dictionary->find(key);
-  return value != nullptr ? value->asDouble() : std::nullopt;
-}
-
-std::optional<double> firstRow(const platform::List& list, std::string_view key) {
-  if (list.empty() || list.at(0).asDictionary() == nullptr) return std::nullopt;
-  return numberIn(*list.at(0).asDictionary(), key);
-}
-
-std::string firstRowText(const platform::List& list, std::string_view key) {
-  if (list.empty() || list.at(0).asDictionary() == nullptr) return {};
-  const platform::Value* value = list.at(0).asDictionary()->find(key);
-  return value != nullptr && value->asString() != nullptr ? *value->asString() : std::string();
-}
 
 // A client session whose metrics fill a store of its own, as the viewer's do.
 class StoreSession {
@@ -61,6 +44,10 @@ class StoreSession {
   // Runs the main queue until `shown` holds for the store.
   bool shows(const std::function<bool(const MetricValidator&)>& shown) {
     return platform::runMainQueueUntil([&] { return shown(*store_); }, kStepTimeout);
+  }
+  // Runs the main queue until the store shows every one of `values`.
+  bool shows(std::initializer_list<Shown> values) {
+    return shows([values](const MetricValidator& store) { return showsAll(store, values); });
   }
 
  private:
@@ -95,25 +82,17 @@ std::vector<std::pair<std::string, std::string>> screenRows(MetricValidator& sto
 
 using Row = std::pair<std::string, std::string>;
 
-const auto lteShownWithPci = [](double pci) {
-  return [pci](const MetricValidator& store) {
-    return numberIn(store.myLTESCellInfoDict(), "phy_cell_id") == pci;
-  };
-};
-
 // Plays the drive on `fake` and checks each step in `session`'s store.
 void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
   const std::string modem = FakeModemManager::modemPath(0);
   // LTE with neighbours of all three technologies.
-  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return numberIn(store.myLTESCellInfoDict(), "phy_cell_id") == 0x1A0 &&
-           firstRow(store.myLTE().EutraNbrsMeas, "nbr_rsrp") == -105 &&
-           firstRow(store.myLTE().EutraNbrsMeas, "nbr_rsrq") == -14.5 &&
-           firstRow(store.myLTE().UtraNbrsMeas, "rscp") == -90 &&
-           firstRow(store.myLTE().GeraNbrsMeas, "rxlev") == -80 &&
-           firstRow(store.myLTE().RsrpRsrqSinr, "rsrp0") == -97 &&
-           firstRow(store.myLTE().RsrpRsrqSinr, "sinr0") == 12.5;
-  }));
+  ASSERT_TRUE(session.shows({{"myLTESCellInfoDict/phy_cell_id", 0x1A0},
+                             {"myLTE/EutraNbrsMeas/nbr_rsrp", -105},
+                             {"myLTE/EutraNbrsMeas/nbr_rsrq", -14.5},
+                             {"myLTE/UtraNbrsMeas/rscp", -90},
+                             {"myLTE/GeraNbrsMeas/rxlev", -80},
+                             {"myLTE/RsrpRsrqSinr/rsrp0", -97},
+                             {"myLTE/RsrpRsrqSinr/sinr0", 12.5}}));
 
   // The screens show it as they show a phone's.
   EXPECT_THAT(screenRows(session.store(), "LTE", "Serving Cell Info"),
@@ -125,7 +104,7 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
 
   // A handover to PCI 17.
   fake.setCells(0, {lteCell(true, 17, 1300, -92, -10), lteCell(false, 0x1A0, 1300, -104, -13)});
-  ASSERT_TRUE(session.shows(lteShownWithPci(17)));
+  ASSERT_TRUE(session.shows({{"myLTESCellInfoDict/phy_cell_id", 17}}));
 
   // A drop to UMTS.
   fake.setCells(0, {umtsCell(true, 300, 10700, -85, -6), gsmCell(false, 62, 42, 30)});
@@ -136,24 +115,20 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
                                       {"rssi", sdbus::Variant(-60.0)}})}});
   fake.set(modem, mm::kModemInterface,
            {{"AccessTechnologies", property(std::uint32_t{MM_MODEM_ACCESS_TECHNOLOGY_UMTS})}});
-  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return numberIn(store.myUMTSCellInfoDict(), "psc") == 300 &&
-           numberIn(store.myUMTSCellInfoDict(), "dl_uarfcn") == 10700 &&
-           firstRow(store.myUMTS().rXInfo, "rsrp_range") == -85 + 116 &&
-           firstRow(store.myUMTS().geraNbrMeas, "rxlev") == -80;
-  }));
+  ASSERT_TRUE(session.shows({{"myUMTSCellInfoDict/psc", 300},
+                             {"myUMTSCellInfoDict/dl_uarfcn", 10700},
+                             {"myUMTS/rXInfo/rsrp_range", -85 + 116},
+                             {"myUMTS/geraNbrMeas/rxlev", -80}}));
 
   // And on to GSM.
   fake.setCells(0, {gsmCell(true, 62, 42, 33), umtsCell(false, 301, 10700, -101, -12.5)});
   fake.set(
       modem, mm::kSignalInterface,
       {{"Umts", property(Entries{})}, {"Gsm", property(Entries{{"rssi", sdbus::Variant(-77.0)}})}});
-  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return numberIn(store.myGSMScellInfoDict(), "arfcn") == 62 &&
-           numberIn(store.myGSMScellInfoDict(), "bsic") == 42 &&
-           numberIn(store.myGSMIdleScellMeasDict(), "idle_rxlev_dBm") == -77 &&
-           firstRow(store.myGSM().utraNbrMeas, "cpich_rscp") == -101;
-  }));
+  ASSERT_TRUE(session.shows({{"myGSMScellInfoDict/arfcn", 62},
+                             {"myGSMScellInfoDict/bsic", 42},
+                             {"myGSMIdleScellMeasDict/idle_rxlev_dBm", -77},
+                             {"myGSM/utraNbrMeas/cpich_rscp", -101}}));
 
   EXPECT_THAT(screenRows(session.store(), "GSM", "Serving Cell Info"),
               ::testing::IsSupersetOf({Row{"arfcn", "62"}, Row{"bsic", "42"}}));
@@ -170,14 +145,12 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
            {{"Bearers", property(std::vector<sdbus::ObjectPath>{
                             sdbus::ObjectPath(FakeModemManager::bearerPath(1))})}});
   ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return firstRowText(store.myCommon().activeBearer, "apn") == "internet" &&
-           numberIn(store.myCellularActiveBearerDict(), "bearer_context_count") == 1;
+    return valueAt(store, "myCommon/activeBearer/apn") == platform::Value("internet") &&
+           shownAt(store, "myCellularActiveBearerDict/bearer_context_count") == 1;
   }));
   // ...and goes down.
   fake.set(FakeModemManager::bearerPath(1), mm::kBearerInterface, {{"Connected", property(false)}});
-  ASSERT_TRUE(session.shows([](const MetricValidator& store) {
-    return numberIn(store.myCellularActiveBearerDict(), "bearer_context_count") == 0;
-  }));
+  ASSERT_TRUE(session.shows({{"myCellularActiveBearerDict/bearer_context_count", 0}}));
 
   // The SIM is reported.
   fake.addSim(0, {{"SimIdentifier", property(std::string("8931041010654378930"))},
@@ -187,7 +160,7 @@ void driveAndCheck(FakeModemManager& fake, StoreSession& session) {
            {{"Sim", property(sdbus::ObjectPath(FakeModemManager::simPath(0)))}});
   ASSERT_TRUE(session.shows([](const MetricValidator& store) {
     return store.myCommon().simContents.size() == 3 &&
-           firstRow(store.myCommon().simContents, "ef_id") == 0x2FE2;
+           shownAt(store, "myCommon/simContents/ef_id") == 0x2FE2;
   }));
 }
 

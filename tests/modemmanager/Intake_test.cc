@@ -4,8 +4,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <functional>
+#include <span>
 
+#include "StoreValues.h"
 #include "codec/Codable.h"
 #include "store/StoreTesting.h"
 #include "tarn/mm/Metrics.h"
@@ -13,6 +14,8 @@
 
 namespace {
 
+using mmtest::Shown;
+using mmtest::shownAt;
 using platform::Dictionary;
 using platform::List;
 using store::MetricValidator;
@@ -46,25 +49,9 @@ Cell cell(Rat rat, bool serving) {
   return cell;
 }
 
-std::optional<double> number(const Dictionary& dictionary, std::string_view key) {
-  const platform::Value* value = dictionary.find(key);
-  return value != nullptr ? value->asDouble() : std::nullopt;
-}
-
-std::optional<double> numberIn(const std::optional<Dictionary>& dictionary, std::string_view key) {
-  return dictionary ? number(*dictionary, key) : std::nullopt;
-}
-
-// One value as the store shows it after the intake.
-struct Shown {
-  std::string_view what;
-  std::function<std::optional<double>(const MetricValidator&)> read;
-  double expected;
-};
-
-std::function<std::optional<double>(const MetricValidator&)> inList(
-    const List& (*list)(const MetricValidator&), std::string_view key) {
-  return [list, key](const MetricValidator& store) { return number(row(list(store), 0), key); };
+void expectShown(const MetricValidator& store, std::span<const Shown> values) {
+  for (const Shown& value : values)
+    EXPECT_EQ(shownAt(store, value.path), value.expected) << value.path;
 }
 
 TEST_F(ModemManagerIntakeTest, ShowsAnLteModemsValuesAsModemManagerReportedThem) {
@@ -95,30 +82,16 @@ TEST_F(ModemManagerIntakeTest, ShowsAnLteModemsValuesAsModemManagerReportedThem)
   take(snapshot);
 
   const Shown shown[] = {
-      {"serving PCI", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "phy_cell_id"); }, 416},
-      {"TAC", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "tracking_area_code"); },
-       0x84CD},
-      {"MCC", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "sel_plmn_mcc"); }, 210},
-      {"MNC", [](auto& s) { return numberIn(s.myLTESCellInfoDict(), "sel_plmn_mnc"); }, 34},
-      {"RSRP", inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "rsrp0"), -97},
-      {"RSRQ", inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "rsrq0"), -11},
-      {"SINR", inList([](auto& s) -> const List& { return s.myLTE().RsrpRsrqSinr; }, "sinr0"),
-       12.5},
-      {"neighbour RSRP",
-       inList([](auto& s) -> const List& { return s.myLTE().EutraNbrsMeas; }, "nbr_rsrp"), -105},
-      {"neighbour RSRQ",
-       inList([](auto& s) -> const List& { return s.myLTE().EutraNbrsMeas; }, "nbr_rsrq"), -14.5},
-      {"UMTS neighbour RSCP",
-       inList([](auto& s) -> const List& { return s.myLTE().UtraNbrsMeas; }, "rscp"), -90},
-      {"UMTS neighbour Ec/Io",
-       inList([](auto& s) -> const List& { return s.myLTE().UtraNbrsMeas; }, "ecno"), -7.5},
-      {"GSM neighbour RxLev",
-       inList([](auto& s) -> const List& { return s.myLTE().GeraNbrsMeas; }, "rxlev"), -80},
+      {"myLTESCellInfoDict/phy_cell_id", 416},   {"myLTESCellInfoDict/tracking_area_code", 0x84CD},
+      {"myLTESCellInfoDict/sel_plmn_mcc", 210},  {"myLTESCellInfoDict/sel_plmn_mnc", 34},
+      {"myLTE/RsrpRsrqSinr/rsrp0", -97},         {"myLTE/RsrpRsrqSinr/rsrq0", -11},
+      {"myLTE/RsrpRsrqSinr/sinr0", 12.5},        {"myLTE/EutraNbrsMeas/nbr_rsrp", -105},
+      {"myLTE/EutraNbrsMeas/nbr_rsrq", -14.5},   {"myLTE/UtraNbrsMeas/rscp", -90},
+      {"myLTE/UtraNbrsMeas/ecno", -7.5},         {"myLTE/GeraNbrsMeas/rxlev", -80},
+      {"myLTESCellInfoDict/freq_band_ind", 3},    // EARFCN 1300
+      {"myLTE/EutraNbrsMeas/freq_band_ind", 20},  // EARFCN 6300
   };
-  for (const Shown& value : shown)
-    EXPECT_EQ(value.read(validator), value.expected) << value.what;
-  EXPECT_EQ(numberIn(validator.myLTESCellInfoDict(), "freq_band_ind"), 3) << "EARFCN 1300";
-  EXPECT_EQ(number(row(validator.myLTE().EutraNbrsMeas, 0), "freq_band_ind"), 20) << "EARFCN 6300";
+  expectShown(validator, shown);
   // The serving cell's tracking area, its PLMN 210-34 in NAS's three bytes.
   const platform::Value* tai = validator.myLTEEMMContextDict()->find("tai_list");
   ASSERT_NE(tai, nullptr);
@@ -168,35 +141,23 @@ TEST_F(ModemManagerIntakeTest, ShowsUmtsAndGsmModemsValuesAsModemManagerReported
   take(gsm);
 
   const Shown shown[] = {
-      {"UMTS PSC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "psc"); }, 300},
-      {"UMTS UARFCN", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "dl_uarfcn"); }, 10700},
-      {"UMTS MNC", [](auto& s) { return numberIn(s.myUMTSCellInfoDict(), "mnc"); }, 410},
+      {"myUMTSCellInfoDict/psc", 300},
+      {"myUMTSCellInfoDict/dl_uarfcn", 10700},
+      {"myUMTSCellInfoDict/mnc", 410},
       // A WCDMA receive measurement is shown as the baseband reports it: as indexes.
-      {"RSCP index", inList([](auto& s) -> const List& { return s.myUMTS().rXInfo; }, "rsrp_range"),
-       -85 + 116},
-      {"Ec/No index",
-       inList([](auto& s) -> const List& { return s.myUMTS().rXInfo; }, "rsrq_range"),
-       (-6 + 24.5) * 2},
-      {"UMTS neighbour RSCP",
-       inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "rscp"), -101},
-      {"UMTS neighbour Ec/Io",
-       inList([](auto& s) -> const List& { return s.myUMTS().utraNbrMeas; }, "ecno"), -12.5},
-      {"LTE neighbour RSRP from UMTS",
-       inList([](auto& s) -> const List& { return s.myUMTS().eUtraNbrMeas; }, "rsrp"), -110},
-      {"GSM ARFCN", [](auto& s) { return numberIn(s.myGSMScellInfoDict(), "arfcn"); }, 62},
-      {"GSM RxLev", [](auto& s) { return numberIn(s.myGSMIdleScellMeasDict(), "idle_rxlev_dBm"); },
-       33 - 110},
-      {"GSM neighbour RxLev",
-       inList([](auto& s) -> const List& { return s.myGSM().geraNbrMeas; }, "rxlev"), -90},
-      {"UMTS neighbour RSCP from GSM",
-       inList([](auto& s) -> const List& { return s.myGSM().utraNbrMeas; }, "cpich_rscp"), -106},
-      {"UMTS neighbour Ec/No from GSM",
-       inList([](auto& s) -> const List& { return s.myGSM().utraNbrMeas; }, "cpich_ecn0"), -21.5},
-      {"LTE neighbour RSRP from GSM",
-       inList([](auto& s) -> const List& { return s.myGSM().eUtraNbrMeas; }, "rsrp"), -120},
+      {"myUMTS/rXInfo/rsrp_range", -85 + 116},
+      {"myUMTS/rXInfo/rsrq_range", (-6 + 24.5) * 2},
+      {"myUMTS/utraNbrMeas/rscp", -101},
+      {"myUMTS/utraNbrMeas/ecno", -12.5},
+      {"myUMTS/eUtraNbrMeas/rsrp", -110},
+      {"myGSMScellInfoDict/arfcn", 62},
+      {"myGSMIdleScellMeasDict/idle_rxlev_dBm", 33 - 110},
+      {"myGSM/geraNbrMeas/rxlev", -90},
+      {"myGSM/utraNbrMeas/cpich_rscp", -106},
+      {"myGSM/utraNbrMeas/cpich_ecn0", -21.5},
+      {"myGSM/eUtraNbrMeas/rsrp", -120},
   };
-  for (const Shown& value : shown)
-    EXPECT_EQ(value.read(validator), value.expected) << value.what;
+  expectShown(validator, shown);
   EXPECT_EQ(*validator.myUMTSCellInfoDict()->find("wcdma_band")->asString(),
             "SYS_BAND_WCDMA_I_IMT_2000");
   EXPECT_EQ(*validator.myGSMScellInfoDict()->find("gsm_band")->asString(), "SYS_BAND_GSM_PGSM_900");
@@ -215,8 +176,8 @@ TEST_F(ModemManagerIntakeTest, MakesNoRecordOfWhatModemManagerDoesNotReport) {
   registeredOnly.registration.operatorPlmn = tarn::mm::parsePlmn("310410");
   take(registeredOnly);
   ASSERT_TRUE(validator.myUMTSCellInfoDict());
-  EXPECT_EQ(numberIn(validator.myUMTSCellInfoDict(), "mcc"), 310);
-  EXPECT_EQ(numberIn(validator.myUMTSCellInfoDict(), "mnc"), 410);
+  const Shown shown[] = {{"myUMTSCellInfoDict/mcc", 310}, {"myUMTSCellInfoDict/mnc", 410}};
+  expectShown(validator, shown);
   EXPECT_EQ(validator.myUMTSCellInfoDict()->find("psc"), nullptr);
 
   // A value that a baseband's index cannot carry is dropped, not clamped.
@@ -248,8 +209,9 @@ TEST_F(ModemManagerIntakeTest, ShowsConnectedBearersAndTheirAddresses) {
   EXPECT_EQ(*context.find("pdp_type")->asString(), "PDP_TYPE_IPv4");
   EXPECT_EQ(*context.find("pdp_addr")->asBytes(), (platform::Bytes{10, 1, 2, 3}));
   EXPECT_EQ(*context.find("secondary_dns_addr")->asBytes(), (platform::Bytes{1, 1, 1, 1}));
-  EXPECT_EQ(number(context, "cid"), 1);
-  EXPECT_EQ(numberIn(validator.myCellularActiveBearerDict(), "bearer_context_count"), 1);
+  const Shown shown[] = {{"myCommon/activeBearer/cid", 1},
+                         {"myCellularActiveBearerDict/bearer_context_count", 1}};
+  expectShown(validator, shown);
 }
 
 }  // namespace

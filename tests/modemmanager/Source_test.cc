@@ -79,6 +79,10 @@ class ModemManagerSourceTest : public ::testing::Test {
     source->start(seen.deliverSink());
   }
 
+  std::shared_ptr<messages::KCellularLteRsrpRsrqSinr> levels() const {
+    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr);
+  }
+
   // The serving PCI of the last LTE serving cell metric, or -1.
   std::int64_t servingPci() const {
     const auto info = seen.last<messages::KCellularLteScellInfo>(ids::KCellularLteScellInfo);
@@ -112,12 +116,9 @@ TEST_F(ModemManagerSourceTest, FollowsTheFirstModemThroughAHandover) {
 
 TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionOnceAndGoesOnWithTheSignal) {
   fake->refuseDeviceControl(true);
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  addServingModem(*fake, 0, kImei, 0x1A0);
   startSource();
-  ASSERT_TRUE(eventually([&] {
-    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr) != nullptr;
-  }));
+  ASSERT_TRUE(eventually([&] { return levels() != nullptr; }));
   ASSERT_TRUE(eventually([&] { return seen.count("refused") == 2; }));
   EXPECT_THAT(seen.lines(),
               Contains("ModemManager refused GetCellInfo: this user lacks the polkit action "
@@ -126,17 +127,14 @@ TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionOnceAndGoesOnWithTheSi
   EXPECT_TRUE(seen.said("ModemManager refused Signal.Setup"));
   // Several refreshes later, still one line each.
   seen.clear();
-  ASSERT_TRUE(eventually([&] {
-    return seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr) != nullptr;
-  }));
+  ASSERT_TRUE(eventually([&] { return levels() != nullptr; }));
   ASSERT_TRUE(eventually([&] {
     return seen.last<messages::KCellularEmmContext>(ids::KCellularEmmContext) != nullptr;
   }));
   EXPECT_EQ(seen.count("refused"), 0u);
   EXPECT_EQ(fake->cellInfoCalls(0), 1u);
   EXPECT_EQ(servingPci(), -1);
-  const auto sample = seen.last<messages::KCellularLteRsrpRsrqSinr>(ids::KCellularLteRsrpRsrqSinr);
-  EXPECT_EQ(sample->instValuesAtIndex(0)->rsrp0(), -97);
+  EXPECT_EQ(levels()->instValuesAtIndex(0)->rsrp0(), -97);
 }
 
 TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRest) {
@@ -152,10 +150,8 @@ TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRe
 }
 
 TEST_F(ModemManagerSourceTest, MovesToTheNextModemWhenItsModemGoesAndStaysWithIt) {
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
-  fake->addModem(1, lteModem(kSecondImei));
-  fake->setCells(1, {lteCell(true, 33, 6300, -100, -12)});
+  addServingModem(*fake, 0, kImei, 0x1A0);
+  addServingModem(*fake, 1, kSecondImei, 33, 6300);
   startSource();
   ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
 
@@ -174,10 +170,8 @@ TEST_F(ModemManagerSourceTest, PicksTheModemOfAnImeiAndWaitsForIt) {
   startSource(std::string(kSecondImei));
   ASSERT_TRUE(eventually([&] { return seen.said("ModemManager has no modem 356938035643809"); }))
       << ::testing::PrintToString(seen.lines());
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
-  fake->addModem(4, lteModem(kSecondImei));
-  fake->setCells(4, {lteCell(true, 33, 6300, -100, -12)});
+  addServingModem(*fake, 0, kImei, 0x1A0);
+  addServingModem(*fake, 4, kSecondImei, 33, 6300);
   ASSERT_TRUE(eventually([&] { return servingPci() == 33; }));
   EXPECT_TRUE(seen.said("following modem 4 "));
 }
@@ -187,16 +181,14 @@ TEST_F(ModemManagerSourceTest, WaitsForModemManagerAndFollowsItThroughARestart) 
   startSource();
   ASSERT_TRUE(eventually([&] { return seen.said("ModemManager is not running"); }));
   fake = std::make_unique<FakeModemManager>(bus.address());
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11)});
+  addServingModem(*fake, 0, kImei, 0x1A0);
   ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
 
   fake.reset();
   ASSERT_TRUE(eventually([&] { return seen.said("ModemManager has left the bus"); }));
   EXPECT_TRUE(seen.said("modem 0 has gone away"));
   fake = std::make_unique<FakeModemManager>(bus.address());
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 17, 1300, -97, -11)});
+  addServingModem(*fake, 0, kImei, 17);
   EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
 }
 

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "ChildProcess.h"
+#include "tarn/mqtt/BrokerAddress.h"
 
 namespace mqtttest {
 
@@ -41,6 +42,11 @@ class Broker {
   std::uint16_t port() const { return port_; }
   // mqtt://127.0.0.1:PORT/PATH (mqtts:// with TLS), with `credentials@` when given.
   std::string address(const std::string& path, const std::string& credentials = {}) const;
+  // The same address as a link takes it.
+  tarn::mqtt::BrokerAddress linkAddress(const std::string& path,
+                                        const std::string& credentials = {}) const {
+    return *tarn::mqtt::parseBrokerAddress(address(path, credentials)).address;
+  }
 
   // Stops the broker with `signal` (SIGTERM lets it save its sessions) and waits for it.
   void stop(int signal);

@@ -26,7 +26,6 @@ using bustest::RecordingSession;
 using bustest::TemporaryFolder;
 using mqtttest::Broker;
 using mqtttest::Subscriber;
-using tarn::mqtt::BrokerAddress;
 using tarn::mqtt::LinkOptions;
 using tarn::mqtt::Publisher;
 using ::testing::ElementsAreArray;
@@ -35,25 +34,21 @@ using ::testing::HasSubstr;
 constexpr std::string_view kMetrics = "fleet/car-1/metrics";
 constexpr std::string_view kStatus = "fleet/car-1/status";
 
-BrokerAddress addressOf(const Broker& broker, const std::string& path,
-                        const std::string& credentials = {}) {
-  return *tarn::mqtt::parseBrokerAddress(broker.address(path, credentials)).address;
-}
-
-tarn::mqtt::PublisherOptions publisherOptions(const Broker& broker, int qos,
-                                              std::size_t queueLimit) {
-  return {.broker = addressOf(broker, "fleet"),
+tarn::mqtt::PublisherOptions publisherOptions(const Broker& broker, int qos, std::size_t queueLimit,
+                                              std::string device = "car-1",
+                                              std::string source = "sim, seed 1") {
+  return {.broker = broker.linkAddress("fleet"),
           .caFile = std::nullopt,
-          .device = "car-1",
+          .device = std::move(device),
           .qos = qos,
           .queueLimit = queueLimit,
-          .source = "sim, seed 1",
+          .source = std::move(source),
           .name = "tarnd"};
 }
 
 LinkOptions watching(const Broker& broker, std::string pattern) {
   LinkOptions options;
-  options.broker = addressOf(broker, "fleet");
+  options.broker = broker.linkAddress("fleet");
   options.subscriptions = {std::move(pattern)};
   return options;
 }
@@ -170,7 +165,7 @@ TEST(APublisher, RefusedForItsPasswordSaysSoOnceAndKeepsTakingMetrics) {
                 {.account = std::pair("car", "right"), .tls = {}, .persistent = false});
   platform::log::Capture log;
   tarn::mqtt::PublisherOptions options = publisherOptions(broker, 1, 10);
-  options.broker = addressOf(broker, "fleet", "car:wrong");
+  options.broker = broker.linkAddress("fleet", "car:wrong");
   Publisher publisher(std::move(options));
   // The library tries again after 1, 2 and 4 s.
   std::this_thread::sleep_for(3500ms);
@@ -220,6 +215,13 @@ constexpr std::uint32_t kRrcState = 0x3C4E04;
 constexpr std::uint32_t kCaStatus = 0x3CD313;
 constexpr std::uint32_t kSimFiles = 0x3C0013;
 
+// The query a viewer sends for the SIM files.
+tarn::CommandResult querySimFiles(RecordingSession& session) {
+  return session.perform(tarn::kCommandQueryMetric,
+                         bustest::withAppId({bustest::entry(
+                             tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+}
+
 tarn::service::Metric metric(std::uint32_t metricId, std::uint8_t mark) {
   return {metricId, platform::Bytes{0x08, mark}};
 }
@@ -256,28 +258,19 @@ TEST(AMetricMessage, IsReadOrRefusedWithTheReason) {
 TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
   TemporaryFolder folder;
   Broker broker(folder.path(), {});
-  const auto address = [&](const std::string& path) {
-    return *tarn::mqtt::parseBrokerAddress(broker.address(path)).address;
-  };
   platform::log::Capture log;
   auto transport = std::make_shared<tarn::mqtt::MqttTransport>(
-      tarn::mqtt::RemoteDevice{address("fleet/car-3"), std::nullopt, "norvo"});
+      tarn::mqtt::RemoteDevice{broker.linkAddress("fleet/car-3"), std::nullopt, "norvo"});
   RecordingSession session(*transport);
   ASSERT_EQ(session.configure("0x3C4E04\n0x3CD313\n"), tarn::CommandResult{});
 
-  auto publisher = std::make_unique<tarn::mqtt::Publisher>(
-      tarn::mqtt::PublisherOptions{.broker = address("fleet"),
-                                   .caFile = std::nullopt,
-                                   .device = "car-3",
-                                   .qos = 1,
-                                   .queueLimit = 100,
-                                   .source = "sim, seed 3",
-                                   .name = "tarnd"});
+  auto publisher =
+      std::make_unique<Publisher>(publisherOptions(broker, 1, 100, "car-3", "sim, seed 3"));
   ASSERT_TRUE(eventually([&] { return transport->device().status().status == "online"; }));
 
   // Messages that do not read, among good ones, from a client that is no tarnd.
   tarn::mqtt::LinkOptions rogueOptions;
-  rogueOptions.broker = address("fleet");
+  rogueOptions.broker = broker.linkAddress("fleet");
   rogueOptions.name = "rogue";
   tarn::mqtt::Link rogue(rogueOptions, {});
   rogue.start();
@@ -307,10 +300,7 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
     EXPECT_THAT(log.plainLines(), ::testing::Contains(HasSubstr(reason)));
 
   // A query is answered with the last metric of its kind that the device published.
-  const tarn::CommandResult query = session.perform(
-      tarn::kCommandQueryMetric, bustest::withAppId({bustest::entry(
-                                     tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
-  EXPECT_EQ(query, tarn::CommandResult{});
+  EXPECT_EQ(querySimFiles(session), tarn::CommandResult{});
   ASSERT_TRUE(eventually([&] { return metricIds().size() >= 3; }));
   EXPECT_EQ(metricIds().back(), kSimFiles);
 
@@ -324,16 +314,7 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
 TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
   TemporaryFolder folder;
   Broker broker(folder.path(), {});
-  const auto address = [&](const std::string& path) {
-    return *tarn::mqtt::parseBrokerAddress(broker.address(path)).address;
-  };
-  tarn::mqtt::Publisher publisher({.broker = address("fleet"),
-                                   .caFile = std::nullopt,
-                                   .device = "car-4",
-                                   .qos = 1,
-                                   .queueLimit = 100,
-                                   .source = "scripted",
-                                   .name = "tarnd"});
+  Publisher publisher(publisherOptions(broker, 1, 100, "car-4", "scripted"));
   auto scripted = std::make_shared<tarn::testing::ScriptedMetricSource>();
   tarn::mqtt::PublishingSource source(scripted, publisher, "fleet", "car-4");
   source.start([](const tarn::service::Metric&) {});
@@ -345,16 +326,11 @@ TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
 
   platform::log::Capture log;
   tarn::mqtt::MqttTransport transport(
-      tarn::mqtt::RemoteDevice{address("fleet/car-4"), std::nullopt, "norvo"});
+      tarn::mqtt::RemoteDevice{broker.linkAddress("fleet/car-4"), std::nullopt, "norvo"});
   {
     RecordingSession session(transport);
     ASSERT_EQ(session.configure("0x3C4E04\n"), tarn::CommandResult{});
-    const auto query = [&] {
-      return session.perform(tarn::kCommandQueryMetric,
-                             bustest::withAppId({bustest::entry(
-                                 tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
-    };
-    ASSERT_TRUE(eventually([&] { return query() == tarn::CommandResult{}; }));
+    ASSERT_TRUE(eventually([&] { return querySimFiles(session) == tarn::CommandResult{}; }));
     const std::vector<bustest::ReceivedEvent> events = session.waitFor(2);
     ASSERT_GE(events.size(), 2u);
     const tarn::ipc::Object& answer = events[1].record;

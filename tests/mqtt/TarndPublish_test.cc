@@ -48,7 +48,7 @@ TEST(APublishingTarnd, PublishesWhatItRecordsAndLeavesALastWillWhenKilled) {
   TemporaryFolder folder;
   Broker broker(folder.path(), {});
   tarn::mqtt::LinkOptions options;
-  options.broker = *tarn::mqtt::parseBrokerAddress(broker.address("fleet")).address;
+  options.broker = broker.linkAddress("fleet");
   options.subscriptions = {"fleet/#"};
   Subscriber subscriber(options);
   ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));

@@ -66,11 +66,12 @@ std::uint64_t peakResidentKiB(pid_t pid) {
 }
 
 std::unique_ptr<ChildProcess> startNorvo(std::vector<std::string> arguments,
-                                         const std::filesystem::path& errors) {
+                                         const std::filesystem::path& errors,
+                                         std::filesystem::path output = "/dev/null") {
   arguments.insert(arguments.begin(), NORVO_VIEWER);
   return std::make_unique<ChildProcess>(ChildProcess::Options{
       .arguments = std::move(arguments),
-      .standardOutput = "/dev/null",
+      .standardOutput = std::move(output),
       .standardError = errors,
       .descriptor3 = std::nullopt,
   });
@@ -114,12 +115,7 @@ TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoe
 }
 
 TEST_F(OverloadTest, TheIntakeFailsWhenItsLogLinesCannotBeWritten) {
-  auto intake = std::make_unique<ChildProcess>(ChildProcess::Options{
-      .arguments = {NORVO_VIEWER, "intake", drive()},
-      .standardOutput = "/dev/full",
-      .standardError = file("full.err"),
-      .descriptor3 = std::nullopt,
-  });
+  auto intake = startNorvo({"intake", drive()}, file("full.err"), "/dev/full");
   EXPECT_EQ(intake->wait(60s), 1);
   EXPECT_NE(intake->standardError().find("norvo intake: cannot write the log lines to standard "
                                          "output: No space left on device"),

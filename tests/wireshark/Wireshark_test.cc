@@ -105,34 +105,18 @@ TEST(Wireshark, TsharkDecodesAnExportedDriveAsTheIntakeDoes) {
 
   const std::map<std::string, std::string> fields = fieldPerKind(metrics);
   ASSERT_GE(fields.size(), 28u) << "the drive should show nearly every record kind";
-  std::vector<std::string> tshark = {"tshark",
-                                     "-r",
-                                     (folder / "drive.pcapng").string(),
-                                     "-X",
-                                     "lua_script:" NORVO_DISSECTOR,
-                                     "-o",
-                                     "protobuf.preload_protos:TRUE",
-                                     "-o",
-                                     "protobuf.pbf_as_hf:TRUE",
-                                     "-o",
-                                     "uat:protobuf_search_paths:\"" NORVO_PROTO_DIR "\",\"TRUE\"",
-                                     "-o",
-                                     "uat:protobuf_search_paths:\"" PROTOBUF_INCLUDE_DIR
-                                     "\",\"FALSE\"",
-                                     "-T",
-                                     "fields",
-                                     "-E",
-                                     "separator=/t",
-                                     "-E",
-                                     "occurrence=f",
-                                     "-e",
-                                     "frame.time_epoch",
-                                     "-e",
-                                     "norvo.metric_id",
-                                     "-e",
-                                     "norvo.record",
-                                     "-e",
-                                     "norvo.device"};
+  std::vector<std::string> tshark = {
+      "tshark", "-r",    (folder / "drive.pcapng").string(), "-X", "lua_script:" NORVO_DISSECTOR,
+      "-T",     "fields"};
+  const auto each = [&tshark](std::string_view flag, std::vector<std::string> values) {
+    for (std::string& value : values)
+      tshark.insert(tshark.end(), {std::string(flag), std::move(value)});
+  };
+  each("-o", {"protobuf.preload_protos:TRUE", "protobuf.pbf_as_hf:TRUE",
+              "uat:protobuf_search_paths:\"" NORVO_PROTO_DIR "\",\"TRUE\"",
+              "uat:protobuf_search_paths:\"" PROTOBUF_INCLUDE_DIR "\",\"FALSE\""});
+  each("-E", {"separator=/t", "occurrence=f"});
+  each("-e", {"frame.time_epoch", "norvo.metric_id", "norvo.record", "norvo.device"});
   std::vector<std::string> kinds;
   for (const auto& [record, key] : fields) {
     kinds.push_back(record);

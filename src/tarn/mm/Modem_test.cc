@@ -46,18 +46,16 @@ TEST(ReadingACell, TakesEachTechnologysKeysAndSkipsCellTypesWithoutARecord) {
                                             {"rsrq", d(-11.5)},
                                             {"timing-advance", u(3)}},
                                            "cell 0", problems);
-  ASSERT_TRUE(lte);
-  EXPECT_EQ(lte->rat, Rat::Lte);
-  EXPECT_TRUE(lte->serving);
-  EXPECT_EQ(lte->plmn->mcc, 210u);
-  EXPECT_EQ(lte->plmn->mnc, 34u);
-  EXPECT_EQ(lte->plmn->mncDigits, 2u);
-  EXPECT_EQ(lte->tac, 0x84CDu);
-  EXPECT_EQ(lte->cellId, 0xD30156u);
-  EXPECT_EQ(lte->pci, 0x1A0u);
-  EXPECT_EQ(lte->channel, 1300u);
-  EXPECT_EQ(lte->rsrp, -97.0);
-  EXPECT_EQ(lte->rsrq, -11.5);
+  Cell expected;  // LTE, with nothing of the other technologies
+  expected.serving = true;
+  expected.plmn = Plmn{210, 34, 2, "21034"};
+  expected.tac = 0x84CD;
+  expected.cellId = 0xD30156;
+  expected.pci = 0x1A0;
+  expected.channel = 1300;
+  expected.rsrp = -97;
+  expected.rsrq = -11.5;
+  EXPECT_EQ(lte, expected);
 
   const std::optional<Cell> gsm = readCell({{"cell-type", u(MM_CELL_TYPE_GSM)},
                                             {"serving", b(false)},
@@ -68,8 +66,7 @@ TEST(ReadingACell, TakesEachTechnologysKeysAndSkipsCellTypesWithoutARecord) {
                                             {"rx-level", u(40)}},
                                            "cell 1", problems);
   ASSERT_TRUE(gsm);
-  EXPECT_EQ(gsm->plmn->mnc, 410u);
-  EXPECT_EQ(gsm->plmn->mncDigits, 3u);
+  EXPECT_EQ(gsm->plmn, (Plmn{310, 410, 3, "310410"}));
   EXPECT_EQ(gsm->bsic, 0x2Au);
   EXPECT_EQ(gsm->rxLevel, 40u);
   EXPECT_THAT(problems, IsEmpty());
@@ -91,13 +88,11 @@ TEST(ReadingACell, DropsOddValuesButKeepsTheRest) {
                                              {"rscp", d(-80)},
                                              {"ecio", d(5)}},
                                             "cell 0", problems);
-  ASSERT_TRUE(cell);
-  EXPECT_FALSE(cell->plmn);
-  EXPECT_FALSE(cell->lac);
-  EXPECT_FALSE(cell->channel);
-  EXPECT_FALSE(cell->psc);
-  EXPECT_EQ(cell->rscp, -80.0);
-  EXPECT_FALSE(cell->ecio);
+  Cell expected;  // the RSCP alone
+  expected.rat = Rat::Umts;
+  expected.serving = true;
+  expected.rscp = -80;
+  EXPECT_EQ(cell, expected);
   EXPECT_THAT(problems, SizeIs(5));
 }
 

@@ -18,6 +18,7 @@ struct Plmn {
   std::uint32_t mnc = 0;
   std::uint32_t mncDigits = 0;  // 2 or 3
   std::string digits;           // "21034"
+  bool operator==(const Plmn&) const = default;
 };
 
 // One cell of GetCellInfo.
@@ -35,6 +36,7 @@ struct Cell {
   std::optional<std::uint32_t> rxLevel;  // GSM "rx-level", 0 to 63
   std::optional<double> rsrp, rsrq;      // LTE, dBm and dB
   std::optional<double> rscp, ecio;      // UMTS, dBm and dB
+  bool operator==(const Cell&) const = default;
 };
 
 // The Signal interface's dictionaries.

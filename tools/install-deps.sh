@@ -13,7 +13,7 @@ packages=(
   libtomlplusplus-dev
   chromium nodejs
   tshark
-  clang libclang-rt-14-dev
+  clang libclang-rt-14-dev clang-tidy
 )
 
 missing=()

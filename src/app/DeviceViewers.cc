@@ -56,7 +56,7 @@ std::string_view hostName(std::string_view host) {
 
 DeviceViewers::DeviceViewers(tarn::mqtt::BrokerAddress broker, std::optional<std::string> caFile,
                              boost::asio::ip::address listen)
-    : broker_(std::move(broker)), caFile_(std::move(caFile)), listen_(listen) {}
+    : broker_(std::move(broker)), caFile_(std::move(caFile)), listen_(std::move(listen)) {}
 
 DeviceViewers::~DeviceViewers() {
   for (const auto& [device, viewer] : viewers_)

@@ -4,6 +4,7 @@
 BUILD      ?= build
 ASAN_BUILD ?= build-asan
 FUZZ_BUILD ?= build-fuzz
+TIDY_BUILD ?= build-tidy
 FUZZ_SECONDS ?= 60
 JOBS       ?= $(shell nproc)
 CMAKE_ARGS ?=
@@ -60,8 +61,13 @@ format-check:
 	git ls-files '*.h' '*.cc' | xargs clang-format --dry-run -Werror
 
 # clang-tidy with the checks of .clang-tidy over every source of ours (not the generated ones).
-tidy: build
-	run-clang-tidy -quiet -p $(BUILD) '$(CURDIR)/(src|tools|tests|bench|fuzz)/.*\.cc$$'
+# clang-tidy reads each source as its own translation unit, so it has a build of its own without
+# unity batches (built first, for the generated headers).
+tidy: deps
+	@tools/install-deps.sh tidy
+	@$(call configure,$(TIDY_BUILD),-DCMAKE_BUILD_TYPE=Debug -DNORVO_UNITY=OFF -DNORVO_BENCHMARKS=ON)
+	cmake --build $(TIDY_BUILD) -j $(JOBS)
+	run-clang-tidy -quiet -p $(TIDY_BUILD) '$(CURDIR)/(src|tools|tests|bench|fuzz)/.*\.cc$$'
 
 clean:
-	rm -rf $(BUILD) $(ASAN_BUILD) $(FUZZ_BUILD)
+	rm -rf $(BUILD) $(ASAN_BUILD) $(FUZZ_BUILD) $(TIDY_BUILD)

@@ -100,7 +100,7 @@ Largest& largest() {
   return instance;
 }
 
-ui::web::Request get(std::string target) {
+ui::web::Request get(const std::string& target) {
   ui::web::Request request(http::verb::get, target, 11);
   request.set(http::field::host, "127.0.0.1");
   return request;
@@ -147,13 +147,13 @@ BENCHMARK(BM_DetailScreenHtml)->Unit(benchmark::kMicrosecond);
 // One browser tab: a kept-alive connection that asks for its screen's JSON once a second.
 class PollingClient {
  public:
-  PollingClient(asio::io_context& context, asio::ip::tcp::endpoint server, std::string target,
-                Clock::time_point start, Clock::time_point end, std::vector<double>& latenciesMs,
-                std::size_t& failed)
+  PollingClient(asio::io_context& context, asio::ip::tcp::endpoint server,
+                const std::string& target, Clock::time_point start, Clock::time_point end,
+                std::vector<double>& latenciesMs, std::size_t& failed)
       : stream_(context),
         timer_(context),
-        server_(server),
-        request_(get(std::move(target))),
+        server_(std::move(server)),
+        request_(get(target)),
         next_(start),
         end_(end),
         latenciesMs_(latenciesMs),

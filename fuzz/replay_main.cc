@@ -133,6 +133,6 @@ int main(int argc, char* argv[]) {
     run(message);
     run(mutated(message, random));
   }
-  std::printf("replayed %llu generated inputs\n", static_cast<unsigned long long>(2 * smoke));
+  std::printf("replayed %llu generated inputs\n", 2ULL * smoke);
   return 0;
 }

@@ -1,6 +1,6 @@
 // Feeds arbitrary bytes to the HTTP server's request parser, with its limits, and what parses to
-// the screen addresses and the access check: request targets, their query strings and cookies.
-// Nothing a client sends may crash or hang them.
+// the screen addresses, the query reader of /api and the access check: request targets, their
+// query strings and cookies. Nothing a client sends may crash or hang them.
 #include <boost/beast/http/parser.hpp>
 #include <boost/beast/http/string_body.hpp>
 #include <cstdint>
@@ -12,6 +12,35 @@
 #include "ui/web/Address.h"
 
 namespace http = boost::beast::http;
+
+namespace {
+
+[[noreturn]] void fail(const char* what) {
+  std::fprintf(stderr, "%s\n", what);
+  std::abort();
+}
+
+// The path as a screen address and the query as the parameters of an /api reading.
+void readTarget(std::string_view target) {
+  const std::size_t mark = target.find('?');
+  const auto path = ui::web::decodePath(target.substr(0, mark));
+  if (path) {
+    for (const std::string& row : *path) {
+      if (row.empty()) fail("an address with an empty row");
+    }
+  }
+  if (mark == std::string_view::npos) return;
+  const std::string_view query = target.substr(mark + 1);
+  if (const auto parameters = ui::web::decodeQuery(query)) {
+    // Each parameter takes at least one byte of the query, and decoding only shortens.
+    if (parameters->size() > query.size()) fail("more parameters than the query holds");
+    for (const auto& [name, value] : *parameters) {
+      if (name.size() + value.size() > query.size()) fail("a parameter longer than its query");
+    }
+  }
+}
+
+}  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   static const platform::log::Silence silence;
@@ -26,27 +55,15 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (!error && !parser.is_header_done()) parser.put_eof(error);
   if (!parser.is_header_done()) {
     // Not a request: the bytes as a target alone.
-    const std::string_view target(reinterpret_cast<const char*>(data), size);
-    (void)ui::web::decodePath(target.substr(0, target.find('?')));
+    readTarget(std::string_view(reinterpret_cast<const char*>(data), size));
     return 0;
   }
   const ui::web::Request& request = parser.get();
-  const std::string_view target = request.target();
-  const auto path = ui::web::decodePath(target.substr(0, target.find('?')));
-  if (path) {
-    for (const std::string& row : *path) {
-      if (row.empty()) {
-        std::fprintf(stderr, "an address with an empty row\n");
-        std::abort();
-      }
-    }
-  }
+  readTarget(request.target());
   if (const auto answer = access.check(request)) {
     if (answer->result() != http::status::unauthorized &&
-        answer->result() != http::status::see_other) {
-      std::fprintf(stderr, "the access check answered neither 401 nor 303\n");
-      std::abort();
-    }
+        answer->result() != http::status::see_other)
+      fail("the access check answered neither 401 nor 303");
   }
   return 0;
 }

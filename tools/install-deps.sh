@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Installs the Debian packages Norvo needs that are missing; says nothing
 # when every one is already there. `install-deps.sh fuzz` adds what the
-# libFuzzer builds need.
+# libFuzzer builds need, `install-deps.sh tidy` clang-tidy.
 set -euo pipefail
 
 packages=(
@@ -15,7 +15,10 @@ packages=(
   chromium nodejs
   tshark
 )
-[[ "${1:-}" == fuzz ]] && packages+=(clang libclang-rt-14-dev)
+case "${1:-}" in
+  fuzz) packages+=(clang libclang-rt-14-dev) ;;
+  tidy) packages+=(clang-tidy) ;;
+esac
 
 missing=()
 for package in "${packages[@]}"; do

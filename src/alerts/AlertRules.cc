@@ -3,6 +3,7 @@
 #include <toml++/toml.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdlib>
 #include <fstream>
 #include <sstream>
@@ -32,9 +33,12 @@ class Faults {
   std::string fileName_;
 };
 
+// TOML has nan and inf, which are no level and no time.
 std::optional<double> numberOf(const toml::node& node) {
   if (const auto integer = node.value_exact<std::int64_t>()) return static_cast<double>(*integer);
-  return node.value_exact<double>();
+  const std::optional<double> number = node.value_exact<double>();
+  if (!number || !std::isfinite(*number)) return std::nullopt;
+  return number;
 }
 
 // The seconds under `key` as milliseconds, when present and sensible.

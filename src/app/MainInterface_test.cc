@@ -17,7 +17,7 @@ using platform::List;
 // Browses the real screens the way a browser does, over a store of the test's own.
 class TheBrowser : public ::testing::Test {
  protected:
-  ui::web::Response get(std::string target) {
+  ui::web::Response get(const std::string& target) {
     ui::web::Request request(http::verb::get, target, 11);
     request.set(http::field::host, "127.0.0.1:8080");
     return site.handle(request);

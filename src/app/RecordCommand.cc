@@ -133,7 +133,7 @@ void MetricExporter::metricsDidUpdate(const platform::Dictionary& metric) {
 }
 
 bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
-                         std::shared_ptr<TarnWrapperDelegate> receiver) {
+                         const std::shared_ptr<TarnWrapperDelegate>& receiver) {
   useService(run.service, run.service.builtIn()
                               ? std::make_shared<tarn::sim::SimulatorSource>(run.seed, run.speed)
                               : nullptr);

@@ -68,6 +68,6 @@ struct RecordingRun {
 // every delivered metric to `receiver` on the main queue until the run is over or SIGINT or
 // SIGTERM arrives. False when the service refused the configuration.
 bool runRecordingSession(const RecordingRun& run, const std::string& configurationPath,
-                         std::shared_ptr<TarnWrapperDelegate> receiver);
+                         const std::shared_ptr<TarnWrapperDelegate>& receiver);
 
 }  // namespace app

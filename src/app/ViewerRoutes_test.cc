@@ -36,7 +36,7 @@ class ViewerRoutes : public ::testing::Test {
   ViewerRoutes() { events.addPages(display); }
 
   ui::web::Response call(const std::string& target, http::verb method = http::verb::get,
-                         std::string body = {}, std::string type = "application/json") {
+                         std::string body = {}, const std::string& type = "application/json") {
     if (!site) {
       site = std::make_unique<ui::web::Site>(
           pages, ui::web::Site::Options{false, display.readings, display.queries, display.documents,

@@ -16,11 +16,11 @@ static_assert(std::is_nothrow_move_constructible_v<Dictionary>);
 namespace {
 
 // Whether a floating value lies within the range of the integer type I. Both bounds are
-// powers of two (or zero), so they convert to F without rounding.
+// powers of two (or zero), so they are exact in F: the lowest, and 2^digits, one above the highest.
 template <std::integral I, std::floating_point F>
 bool withinRangeOf(F value) {
   const F lowest = static_cast<F>(std::numeric_limits<I>::min());
-  const F aboveHighest = static_cast<F>(std::numeric_limits<I>::max() / 2 + 1) * F{2};
+  const F aboveHighest = std::ldexp(F{1}, std::numeric_limits<I>::digits);
   return value >= lowest && value < aboveHighest;
 }
 

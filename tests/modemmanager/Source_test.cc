@@ -5,6 +5,8 @@
 
 #include <algorithm>
 #include <mutex>
+#include <ranges>
+#include <utility>
 
 #include "Drive.h"
 #include "Eventually.h"
@@ -53,8 +55,8 @@ class Seen {
   template <class Record>
   std::shared_ptr<Record> last(std::uint32_t metricId) const {
     std::lock_guard lock(mutex_);
-    for (auto metric = metrics_.rbegin(); metric != metrics_.rend(); ++metric) {
-      if (metric->metricId == metricId) return Record::initWithData(&metric->payload);
+    for (const auto& metric : std::ranges::reverse_view(metrics_)) {
+      if (metric.metricId == metricId) return Record::initWithData(&metric.payload);
     }
     return nullptr;
   }
@@ -74,7 +76,8 @@ class ModemManagerSourceTest : public ::testing::Test {
  protected:
   void startSource(std::string modem = {}) {
     source = std::make_unique<tarn::mm::ModemManagerSource>(
-        tarn::mm::ModemManagerOptions{.bus = bus.address(), .modem = modem, .refresh = 100ms},
+        tarn::mm::ModemManagerOptions{
+            .bus = bus.address(), .modem = std::move(modem), .refresh = 100ms},
         seen.statusSink());
     source->start(seen.deliverSink());
   }

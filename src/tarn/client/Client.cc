@@ -40,9 +40,12 @@ void useTransport(std::shared_ptr<Transport> transport) {
   choice.transport = std::move(transport);
 }
 
+// The client library's calls keep the signatures their callers were written against: handles and
+// texts by value.
+// NOLINTBEGIN(performance-unnecessary-value-param)
 std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue,
                                        Transport& transport) {
-  return Manager::open(clientName, std::move(queue), transport);
+  return Manager::open(clientName, queue, transport);
 }
 
 std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQueue queue) {
@@ -52,7 +55,7 @@ std::shared_ptr<Manager> CreateManager(std::string clientName, platform::SerialQ
                            clientName.c_str());
     return nullptr;
   }
-  return Manager::open(clientName, std::move(queue), *transport);
+  return Manager::open(clientName, queue, *transport);
 }
 
 CommandResult PerformCommand(std::shared_ptr<Manager> manager, std::string command,
@@ -77,5 +80,6 @@ void EventsOff(std::shared_ptr<Manager> manager) {
 void EventsOn(std::shared_ptr<Manager> manager) {
   if (hasSession(manager, "EventsOn")) manager->setEventsOn(true);
 }
+// NOLINTEND(performance-unnecessary-value-param)
 
 }  // namespace tarn::client

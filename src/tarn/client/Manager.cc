@@ -25,7 +25,7 @@ constexpr std::size_t kFallingBehind = 512;
 // the queue rather than one per event.
 class Manager::Events : public std::enable_shared_from_this<Events> {
  public:
-  explicit Events(platform::SerialQueue queue) : queue_(std::move(queue)) {}
+  explicit Events(const platform::SerialQueue& queue) : queue_(queue) {}
 
   void setHandler(std::string event, EventHandler handler) {
     auto shared = std::make_shared<const EventHandler>(std::move(handler));
@@ -89,9 +89,9 @@ class Manager::Events : public std::enable_shared_from_this<Events> {
   bool handOnQueued_ = false;
 };
 
-std::shared_ptr<Manager> Manager::open(const std::string& clientName, platform::SerialQueue queue,
-                                       Transport& transport) {
-  std::shared_ptr<Manager> manager(new Manager(std::make_shared<Events>(std::move(queue))));
+std::shared_ptr<Manager> Manager::open(const std::string& clientName,
+                                       const platform::SerialQueue& queue, Transport& transport) {
+  std::shared_ptr<Manager> manager(new Manager(std::make_shared<Events>(queue)));
   manager->connection_ = transport.connect(
       clientName,
       [events = std::weak_ptr(manager->events_)](std::string_view event, ipc::Object object) {

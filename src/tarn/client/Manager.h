@@ -12,8 +12,8 @@ namespace tarn::client {
 class Manager {
  public:
   // Empty when the transport cannot connect.
-  static std::shared_ptr<Manager> open(const std::string& clientName, platform::SerialQueue queue,
-                                       Transport& transport);
+  static std::shared_ptr<Manager> open(const std::string& clientName,
+                                       const platform::SerialQueue& queue, Transport& transport);
 
   Manager(const Manager&) = delete;
   Manager& operator=(const Manager&) = delete;

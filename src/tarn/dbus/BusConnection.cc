@@ -179,7 +179,7 @@ void BusConnection::serviceOwnerChanged(sdbus::Message& signal) {
 }
 
 CommandResult BusConnection::performOnLoop(std::string_view command, const ipc::Object& input) {
-  const CommandResult result =
+  CommandResult result =
       session_ || openSession() ? callPerformCommand(command, input) : serviceGone(whyNoSession_);
   wishes_.remember(command, input, result);
   return result;

@@ -192,7 +192,11 @@ void appendRecord(sdbus::Message& message, const ipc::Object& record) {
 }
 
 ipc::Object readRecord(sdbus::Message& message) {
-  return readEntries(MessageAccess::raw(message));
+  return readRecord(MessageAccess::raw(message));
+}
+
+ipc::Object readRecord(sd_bus_message* message) {
+  return readEntries(message);
 }
 
 void appendEvents(sdbus::Message& message, std::span<const Event> events) {
@@ -208,7 +212,10 @@ void appendEvents(sdbus::Message& message, std::span<const Event> events) {
 }
 
 std::vector<Event> readEvents(sdbus::Message& message) {
-  sd_bus_message* raw = MessageAccess::raw(message);
+  return readEvents(MessageAccess::raw(message));
+}
+
+std::vector<Event> readEvents(sd_bus_message* raw) {
   if (sd_bus_message_enter_container(raw, SD_BUS_TYPE_ARRAY, "(sa{sv})") <= 0) {
     throw MalformedRecord("the events are not a(sa{sv})");
   }

@@ -30,8 +30,9 @@ ModemManagerSource::~ModemManagerSource() {
 void ModemManagerSource::start(std::function<void(service::Metric)> deliver) {
   std::lock_guard lock(mutex_);
   if (worker_.joinable()) return;
-  worker_ = std::jthread(
-      [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
+  worker_ = std::jthread([this, deliver = std::move(deliver)](std::stop_token stop) {
+    run(std::move(stop), deliver);
+  });
 }
 
 void ModemManagerSource::stop() {

@@ -68,8 +68,9 @@ ReplaySource::~ReplaySource() {
 void ReplaySource::start(std::function<void(service::Metric)> deliver) {
   std::lock_guard lock(mutex_);
   if (worker_.joinable()) return;
-  worker_ = std::jthread(
-      [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
+  worker_ = std::jthread([this, deliver = std::move(deliver)](std::stop_token stop) {
+    run(std::move(stop), deliver);
+  });
 }
 
 void ReplaySource::stop() {

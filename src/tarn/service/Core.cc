@@ -118,7 +118,7 @@ bool Core::hasSubscriber() const {
 // Outside the lock: delivery takes it.
 void Core::startSource() {
   std::call_once(sourceStarted_, [this] {
-    if (source_) source_->start([this](Metric metric) { deliver(metric); });
+    if (source_) source_->start([this](const Metric& metric) { deliver(metric); });
   });
 }
 

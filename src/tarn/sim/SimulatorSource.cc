@@ -49,8 +49,9 @@ SimulatorSource::~SimulatorSource() {
 void SimulatorSource::start(std::function<void(service::Metric)> deliver) {
   std::lock_guard lock(workerMutex_);
   if (worker_.joinable()) return;
-  worker_ = std::jthread(
-      [this, deliver = std::move(deliver)](std::stop_token stop) { run(stop, deliver); });
+  worker_ = std::jthread([this, deliver = std::move(deliver)](std::stop_token stop) {
+    run(std::move(stop), deliver);
+  });
 }
 
 void SimulatorSource::stop() {

@@ -24,7 +24,7 @@ class ASite : public ::testing::Test {
   }
   ~ASite() override { testData() = {}; }
 
-  Response get(std::string target, std::string host = "127.0.0.1:8080",
+  Response get(const std::string& target, const std::string& host = "127.0.0.1:8080",
                http::verb method = http::verb::get) {
     Request request(method, target, 11);
     if (!host.empty()) request.set(http::field::host, host);
@@ -223,7 +223,7 @@ class ASiteWithPagesOfItsOwn : public ASite {
   Site withPages{
       pages, {false, {}, {{"echo", &echo}}, {{"/dashboard", "dashboard.html", "Dashboard"}}, {}}};
 
-  Response getFrom(Site& answering, std::string target) {
+  Response getFrom(Site& answering, const std::string& target) {
     Request request(http::verb::get, target, 11);
     request.set(http::field::host, "localhost");
     return answering.handle(request);
@@ -294,7 +294,7 @@ namespace {
 // Pages shown beyond loopback, to holders of the token "s3cret" only.
 class AGuardedSite : public ASite {
  protected:
-  Response ask(std::string target, std::optional<std::string> cookie = std::nullopt) {
+  Response ask(const std::string& target, std::optional<std::string> cookie = std::nullopt) {
     Request request(http::verb::get, target, 11);
     if (cookie) request.set(http::field::cookie, *cookie);
     return guarded.handle(request);

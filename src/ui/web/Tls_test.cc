@@ -37,9 +37,6 @@ using namespace std::chrono_literals;
 class TestCertificate {
  public:
   TestCertificate() {
-    std::string pattern = (std::filesystem::temp_directory_path() / "norvo-tls-XXXXXX").string();
-    if (::mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp");
-    folder = pattern;
     run("openssl req -x509 -newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -nodes -days 2 "
         "-subj /CN=127.0.0.1 -addext subjectAltName=IP:127.0.0.1 -keyout " +
         key.string() + " -out " + certificate.string());
@@ -49,13 +46,19 @@ class TestCertificate {
   }
   ~TestCertificate() { std::filesystem::remove_all(folder); }
 
-  std::filesystem::path folder;
+  std::filesystem::path folder = makeFolder();
   std::filesystem::path certificate = folder / "cert.pem";
   std::filesystem::path key = folder / "key.pem";
   std::filesystem::path otherKey = folder / "other-key.pem";
   std::filesystem::path garbage = folder / "garbage.pem";
 
  private:
+  static std::filesystem::path makeFolder() {
+    std::string pattern = (std::filesystem::temp_directory_path() / "norvo-tls-XXXXXX").string();
+    if (::mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp");
+    return pattern;
+  }
+
   static void run(const std::string& command) {
     if (std::system((command + " 2>/dev/null").c_str()) != 0)
       throw std::runtime_error("failed: " + command);

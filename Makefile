@@ -61,11 +61,11 @@ format-check:
 	git ls-files '*.h' '*.cc' | xargs clang-format --dry-run -Werror
 
 # clang-tidy with the checks of .clang-tidy over every source of ours (not the generated ones).
-# clang-tidy reads each source as its own translation unit, so it has a build of its own without
-# unity batches (built first, for the generated headers).
+# clang-tidy reads each source as its own translation unit and cannot read GCC's precompiled
+# headers, so it has a build of its own without either (built first, for the generated headers).
 tidy: deps
 	@tools/install-deps.sh tidy
-	@$(call configure,$(TIDY_BUILD),-DCMAKE_BUILD_TYPE=Debug -DNORVO_UNITY=OFF -DNORVO_BENCHMARKS=ON)
+	@$(call configure,$(TIDY_BUILD),-DCMAKE_BUILD_TYPE=Debug -DNORVO_UNITY=OFF -DCMAKE_DISABLE_PRECOMPILE_HEADERS=ON -DNORVO_BENCHMARKS=ON)
 	cmake --build $(TIDY_BUILD) -j $(JOBS)
 	run-clang-tidy -quiet -p $(TIDY_BUILD) '$(CURDIR)/(src|tools|tests|bench|fuzz)/.*\.cc$$'
 

@@ -46,11 +46,7 @@ bool writeLogEvents(std::istream& log, std::string_view logName, bool json, std:
   store::MetricValidator intake(nullptr);
   events::EventRing ring(kRingCapacity);
   events::EventDetector detector(ring);
-  intake.addAcceptedMetricObserver([&detector](std::int64_t metricID,
-                                               const platform::Bytes* payload,
-                                               const platform::Dictionary& decoded) {
-    detector.observe(metricID, payload, decoded);
-  });
+  detector.watch(intake);
   // The intake's own lines are not what this command prints.
   platform::log::Capture intakeLines;
 

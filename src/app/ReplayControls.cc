@@ -48,9 +48,7 @@ platform::List driveMarkers(const player::Drive& drive) {
   store::MetricValidator intake(nullptr);
   events::EventRing ring;
   events::EventDetector detector(ring);
-  intake.addAcceptedMetricObserver(
-      [&detector](std::int64_t id, const platform::Bytes* payload,
-                  const platform::Dictionary& decoded) { detector.observe(id, payload, decoded); });
+  detector.watch(intake);
   const platform::log::Capture quiet;
   platform::List markers;
   std::uint64_t seen = 0;

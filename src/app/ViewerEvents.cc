@@ -89,10 +89,7 @@ EventQuery readEventQuery(const ui::web::QueryParameters& parameters) {
 }  // namespace
 
 ViewerEvents::ViewerEvents(store::MetricValidator& intake) {
-  intake.addAcceptedMetricObserver([this](std::int64_t metricID, const platform::Bytes* payload,
-                                          const platform::Dictionary& decoded) {
-    detector_.observe(metricID, payload, decoded);
-  });
+  detector_.watch(intake);
 }
 
 void ViewerEvents::addPages(ui::DisplayOptions& display) {

@@ -2,6 +2,7 @@
 
 #include <cstdint>
 
+#include "radio/ElementaryFiles.h"
 #include "radio/Iccid.h"
 #include "radio/Imsi.h"
 
@@ -9,14 +10,8 @@ namespace dashboard {
 
 namespace {
 
-// Elementary file IDs (TS 31.102 4.2, TS 102.221 13.2).
-constexpr std::int64_t kEfIccid = 0x2FE2;
-constexpr std::int64_t kEfImsi = 0x6F07;
-constexpr std::int64_t kEfServiceProviderName = 0x6F46;
-constexpr std::int64_t kEfAdministrativeData = 0x6FAD;
-
 // The content of a file of the latest SIM file metric.
-const platform::Bytes* contentOf(const store::MetricValidator& intake, std::int64_t fileId) {
+const platform::Bytes* contentOf(const store::MetricValidator& intake, std::uint32_t fileId) {
   const auto& files = intake.mySIMFileInfoDict();
   if (!files) return nullptr;
   const platform::Value* list = files->find("ef_list");
@@ -43,7 +38,7 @@ char defaultAlphabetCharacter(std::uint8_t code) {
 }  // namespace
 
 std::optional<std::string> serviceProviderName(const store::MetricValidator& intake) {
-  const platform::Bytes* content = contentOf(intake, kEfServiceProviderName);
+  const platform::Bytes* content = contentOf(intake, radio::ef::kServiceProviderName);
   if (content == nullptr || content->size() < 2) return std::nullopt;
   if ((*content)[1] >= 0x80 && (*content)[1] <= 0x82) return std::nullopt;
   std::string name;
@@ -55,11 +50,11 @@ std::optional<std::string> serviceProviderName(const store::MetricValidator& int
 
 std::optional<platform::Dictionary> subscriberOf(const store::MetricValidator& intake) {
   platform::Dictionary subscriber;
-  const platform::Bytes* imsiFile = contentOf(intake, kEfImsi);
+  const platform::Bytes* imsiFile = contentOf(intake, radio::ef::kImsi);
   const auto imsi = imsiFile != nullptr ? radio::decodeEfImsi(*imsiFile) : std::nullopt;
   if (imsi) {
     subscriber.append("imsi", *imsi);
-    const platform::Bytes* administrative = contentOf(intake, kEfAdministrativeData);
+    const platform::Bytes* administrative = contentOf(intake, radio::ef::kAdministrativeData);
     const auto mncLength =
         administrative != nullptr ? radio::mncLengthFromEfAd(*administrative) : std::nullopt;
     const auto parts = radio::splitImsi(
@@ -70,7 +65,7 @@ std::optional<platform::Dictionary> subscriberOf(const store::MetricValidator& i
       subscriber.append("msin", parts->msin);
     }
   }
-  const platform::Bytes* iccidFile = contentOf(intake, kEfIccid);
+  const platform::Bytes* iccidFile = contentOf(intake, radio::ef::kIccid);
   if (const auto iccid = iccidFile != nullptr ? radio::decodeEfIccid(*iccidFile) : std::nullopt)
     subscriber.append("iccid", *iccid);
   if (subscriber.empty()) return std::nullopt;

@@ -57,9 +57,7 @@ void BM_IntakeWithEventDetection(benchmark::State& state) {
   store::MetricValidator intake(nullptr);
   events::EventRing ring;
   events::EventDetector detector(ring);
-  intake.addAcceptedMetricObserver(
-      [&detector](std::int64_t id, const platform::Bytes* payload,
-                  const platform::Dictionary& decoded) { detector.observe(id, payload, decoded); });
+  detector.watch(intake);
   runDrive(state, intake);
   state.counters["events_per_drive"] = benchmark::Counter(static_cast<double>(ring.nextId() - 1) /
                                                           static_cast<double>(state.iterations()));

@@ -4,6 +4,8 @@
 #include <span>
 #include <unordered_map>
 
+#include "store/MetricValidator.h"
+
 namespace events {
 
 namespace {
@@ -147,6 +149,13 @@ void EventDetector::observe(std::int64_t metricID, const platform::Bytes* payloa
     event.metric = metric;
     ring_.add(std::move(event));
   }
+}
+
+void EventDetector::watch(store::MetricValidator& intake) {
+  intake.addAcceptedMetricObserver(
+      [this](std::int64_t id, const platform::Bytes* payload, const platform::Dictionary& decoded) {
+        observe(id, payload, decoded);
+      });
 }
 
 void EventDetector::reset() {

@@ -7,6 +7,10 @@
 #include "events/EventRing.h"
 #include "platform/Value.h"
 
+namespace store {
+class MetricValidator;
+}
+
 namespace events {
 
 // Runs the detectors over each metric the intake accepts and keeps the events they find in a
@@ -20,6 +24,9 @@ class EventDetector {
   // without one takes the time of the metric before it.
   void observe(std::int64_t metricID, const platform::Bytes* payload,
                const platform::Dictionary& decoded);
+
+  // Observes every metric `intake` accepts from now on; the intake must not outlive this.
+  void watch(store::MetricValidator& intake);
 
   // Forgets what the detectors remember, as if no metric had come yet. The ring is its owner's.
   void reset();

@@ -144,12 +144,7 @@ Step simFiles(std::size_t count) {
 // An intake with the detection behind it, as the viewer wires them.
 class DetectorsTest : public ::testing::Test {
  protected:
-  DetectorsTest() {
-    intake.addAcceptedMetricObserver(
-        [this](std::int64_t metricID, const Bytes* payload, const platform::Dictionary& decoded) {
-          detector.observe(metricID, payload, decoded);
-        });
-  }
+  DetectorsTest() { detector.watch(intake); }
 
   void deliver(const Step& step) {
     intake.metricsDidUpdate({{"kKeyMetricID", step.metricID}, {"kKeyPayload", step.payload}});

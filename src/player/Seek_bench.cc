@@ -34,9 +34,7 @@ void BM_SeekInAnHour(benchmark::State& state) {
   store::MetricValidator intake(nullptr);
   events::EventRing ring;
   events::EventDetector detector(ring);
-  intake.addAcceptedMetricObserver(
-      [&detector](std::int64_t id, const platform::Bytes* payload,
-                  const platform::Dictionary& decoded) { detector.observe(id, payload, decoded); });
+  detector.watch(intake);
   player::Player player(
       simulatedHour(),
       {[&] {

@@ -5,15 +5,13 @@
 
 #include "messages/Metrics.h"
 #include "messages/Records.h"
+#include "radio/ElementaryFiles.h"
 #include "radio/Iccid.h"
 #include "radio/Imsi.h"
 
 namespace tarn::mm {
 namespace {
 
-constexpr std::uint32_t kEfIccid = 0x2FE2;
-constexpr std::uint32_t kEfImsi = 0x6F07;
-constexpr std::uint32_t kEfSpn = 0x6F46;
 constexpr std::size_t kSpnNameBytes = 16;
 
 // The characters that the GSM default alphabet codes as ASCII does.
@@ -43,9 +41,9 @@ std::optional<service::Metric> simFilesMetric(const Sim& sim, std::uint64_t atMs
     file->setContent(std::move(content));
     record.addEfList(std::move(file));
   };
-  if (sim.iccid) add(kEfIccid, radio::encodeEfIccid(*sim.iccid));
-  if (sim.imsi) add(kEfImsi, radio::encodeEfImsi(*sim.imsi));
-  if (sim.serviceProvider) add(kEfSpn, encodeEfSpn(*sim.serviceProvider));
+  if (sim.iccid) add(radio::ef::kIccid, radio::encodeEfIccid(*sim.iccid));
+  if (sim.imsi) add(radio::ef::kImsi, radio::encodeEfImsi(*sim.imsi));
+  if (sim.serviceProvider) add(radio::ef::kServiceProviderName, encodeEfSpn(*sim.serviceProvider));
   if (record.efListsCount() == 0) return std::nullopt;
   return service::Metric{messages::metric::KCellularSimCardFiles, record.data()};
 }

@@ -1,8 +1,8 @@
 #include "client/TarnWrapper.h"
 
+#include <array>
 #include <condition_variable>
 #include <fstream>
-#include <iterator>
 #include <mutex>
 #include <string>
 
@@ -44,10 +44,16 @@ constexpr Listener kListeners[] = {
     {tarn::kEventMetric, "%s: MetricsTrigger dict=%@", &TarnWrapperDelegate::metricsDidUpdate},
 };
 
-// The whole file, or nothing when it cannot be read.
+// The whole file, or nothing when it cannot be read. Read a block at a time: a configuration may
+// be as large as a message carries, tens of megabytes.
 platform::Bytes readWholeFile(std::string_view path) {
   std::ifstream file{std::string(path), std::ios::binary};
-  return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  platform::Bytes bytes;
+  std::array<char, std::size_t{1} << 16> block{};
+  while (file.read(block.data(), static_cast<std::streamsize>(block.size())) || file.gcount() > 0) {
+    bytes.insert(bytes.end(), block.begin(), block.begin() + file.gcount());
+  }
+  return bytes;
 }
 
 Object::Entry entry(std::string_view key, Object value) {

@@ -70,48 +70,48 @@ TEST(EntryRules, LeaveEntriesOfAnotherTypeAsTheyAre) {
     EXPECT_EQ(converted(text, {"level", rule}), text);
     EXPECT_EQ(converted(text, {"missing", rule}), text);
   }
-  // A fraction is no integer and no bandwidth code.
-  const Dictionary fraction{{"dl_bw", 2.5}};
-  EXPECT_EQ(converted(fraction, {"dl_bw", EntryRule::BandwidthCode}), fraction);
-  EXPECT_EQ(converted(fraction, {"dl_bw", EntryRule::RxLevIndex}), fraction);
 }
 
-TEST(EntryRules, DropEveryBandwidthCodeOutsideTheTableButKeepWhatIsNoCode) {
-  for (const Value& code : {Value(-1), Value(6), Value(std::int64_t{9})}) {
-    EXPECT_EQ(converted({{"dl_bw", code}, {"earfcn", 300}}, {"dl_bw", EntryRule::BandwidthCode}),
-              (Dictionary{{"earfcn", 300}}))
-        << code.description();
+TEST(EntryRules, ConvertWhatTheyCanAndDropOrLeaveTheRest) {
+  const EntryConversion code{"dl_bw", EntryRule::BandwidthCode};
+  const EntryConversion halved{"dl_bw", EntryRule::HalvedBandwidth};
+  const EntryConversion rscp{"rscp", EntryRule::RscpIndex};
+  const EntryConversion time{"timestamp", EntryRule::TimestampText};
+  const struct {
+    const char* name;
+    Dictionary before;
+    EntryConversion conversion;
+    std::optional<Dictionary> after;  // none: left as it was
+  } cases[] = {
+      {"code 0 in megahertz", {{"dl_bw", 0}}, code, Dictionary{{"dl_bw", 1.4f}}},
+      {"code -1 dropped", {{"dl_bw", -1}, {"earfcn", 300}}, code, Dictionary{{"earfcn", 300}}},
+      {"code 6 dropped", {{"dl_bw", 6}, {"earfcn", 300}}, code, Dictionary{{"earfcn", 300}}},
+      {"code 9 dropped", {{"dl_bw", std::int64_t{9}}}, code, Dictionary{}},
+      {"largest uint32 is no code", {{"dl_bw", std::uint32_t{4294967295u}}}, code, {}},
+      {"2^40 is no code", {{"dl_bw", std::int64_t{1} << 40}}, code, {}},
+      {"text is no code", {{"dl_bw", "3"}}, code, {}},
+      {"a fraction is no code", {{"dl_bw", 2.5}}, code, {}},
+      {"a fraction is no index", {{"dl_bw", 2.5}}, {"dl_bw", EntryRule::RxLevIndex}, {}},
+      {"index would overflow below",
+       {{"rscp", std::numeric_limits<std::int64_t>::min()}},
+       rscp,
+       {}},
+      {"index would overflow above",
+       {{"rscp", std::numeric_limits<std::uint64_t>::max()}},
+       rscp,
+       {}},
+      {"32-bit bandwidth halved", {{"dl_bw", -7}}, halved, Dictionary{{"dl_bw", -3}}},
+      {"wider bandwidth kept", {{"dl_bw", std::uint32_t{4000000000u}}}, halved, {}},
+      {"timestamp shown",
+       {{"timestamp", std::uint64_t{1500}}},
+       time,
+       Dictionary{{"timestamp", "at 1500"}}},
+      {"timestamp the formatter cannot show", {{"timestamp", -5}}, time, {}},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.name);
+    EXPECT_EQ(converted(c.before, c.conversion), c.after.value_or(c.before));
   }
-  for (const Value& notACode :
-       {Value(std::uint32_t{4294967295u}), Value(std::int64_t{1} << 40), Value("3")}) {
-    EXPECT_EQ(converted({{"dl_bw", notACode}}, {"dl_bw", EntryRule::BandwidthCode}),
-              (Dictionary{{"dl_bw", notACode}}))
-        << notACode.description();
-  }
-  EXPECT_EQ(converted({{"dl_bw", 0}}, {"dl_bw", EntryRule::BandwidthCode}),
-            (Dictionary{{"dl_bw", 1.4f}}));
-}
-
-TEST(EntryRules, LeaveIndexesWhoseResultWouldOverflow) {
-  const Dictionary lowest{{"rscp", std::numeric_limits<std::int64_t>::min()}};
-  EXPECT_EQ(converted(lowest, {"rscp", EntryRule::RscpIndex}), lowest);
-  const Dictionary huge{{"rscp", std::numeric_limits<std::uint64_t>::max()}};
-  EXPECT_EQ(converted(huge, {"rscp", EntryRule::RscpIndex}), huge);
-}
-
-TEST(EntryRules, HalveOnly32BitBandwidths) {
-  EXPECT_EQ(converted({{"dl_bw", -7}}, {"dl_bw", EntryRule::HalvedBandwidth}),
-            (Dictionary{{"dl_bw", -3}}));
-  const Dictionary wide{{"dl_bw", std::uint32_t{4000000000u}}};
-  EXPECT_EQ(converted(wide, {"dl_bw", EntryRule::HalvedBandwidth}), wide);
-}
-
-TEST(EntryRules, KeepATimestampTheFormatterCannotShow) {
-  EXPECT_EQ(
-      converted({{"timestamp", std::uint64_t{1500}}}, {"timestamp", EntryRule::TimestampText}),
-      (Dictionary{{"timestamp", "at 1500"}}));
-  const Dictionary early{{"timestamp", -5}};
-  EXPECT_EQ(converted(early, {"timestamp", EntryRule::TimestampText}), early);
 }
 
 TEST(EntryRules, RecogniseTheShapesThatBecomeText) {
@@ -157,18 +157,12 @@ class LteReselectionTest : public LteConversionTest {
   }
 };
 
-TEST_F(LteReselectionTest, KeepsTheNumericTimestampAndShowsTheBandsAsText) {
-  deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 5));
-  const Dictionary& stored = *validator.myLTESelReselDict();
-  EXPECT_EQ(*stored.find("timestamp"), Value(kJuly14));
-  EXPECT_EQ(*stored.find("multi_band_info"), Value("[3, 7]"));
-  EXPECT_THAT(log.plainLines(), ::testing::Contains("[3, 7]"));
-}
-
 // Logged as decoded: numeric timestamp and the bands still a list; the band text follows alone.
-TEST_F(LteReselectionTest, LogsBeforeTheBandsBecomeText) {
+TEST_F(LteReselectionTest, KeepsTheNumericTimestampAndLogsBeforeTheBandsBecomeText) {
   deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 5));
   Dictionary logged = *validator.myLTESelReselDict();
+  EXPECT_EQ(*logged.find("timestamp"), Value(kJuly14));
+  EXPECT_EQ(*logged.find("multi_band_info"), Value("[3, 7]"));
   logged.set("multi_band_info", List{3u, 7u});
   EXPECT_THAT(log.plainLines(),
               ::testing::ElementsAre("Metric ID in Hex = 3CD30E",
@@ -185,21 +179,17 @@ TEST_F(LteReselectionTest, RefreshesItsFixedKeysOneByOne) {
   EXPECT_EQ(*copy.find("Q_hyst"), Value(4u));
   EXPECT_EQ(*copy.find("QRxLevMin"), Value(""));
   EXPECT_FALSE(copy.contains("nbr_eutra"));
+  EXPECT_EQ(row(validator.myLTE().EutraNbrs, 0),
+            (Dictionary{{"earfcn", 1300u}, {"dl_bw", 20.0f}, {"timestamp", kJuly14Text}}));
 
-  // A metric without Q_hyst leaves the one before; field 19 never reaches a decoded record.
-  KCellularLteSelReselCellInfo next = reselection(0, 5);
+  // A metric without Q_hyst leaves the one before; field 19 never reaches a decoded record; an
+  // unknown bandwidth code is dropped.
+  KCellularLteSelReselCellInfo next = reselection(0, 9);
   next.setHasQHyst(false);
   next.setThreshServingLowQ(9);
   deliver(V::K_LTE_SEL_RESEL_INFO, next);
   EXPECT_EQ(*validator.myLTE().SelReselCellInfo.find("Q_hyst"), Value(4u));
   EXPECT_EQ(*validator.myLTE().SelReselCellInfo.find("Thresh_serving_lowQ"), Value(""));
-}
-
-TEST_F(LteReselectionTest, ConvertsNeighbourBandwidthsAndDropsUnknownCodes) {
-  deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 5));
-  EXPECT_EQ(row(validator.myLTE().EutraNbrs, 0),
-            (Dictionary{{"earfcn", 1300u}, {"dl_bw", 20.0f}, {"timestamp", kJuly14Text}}));
-  deliver(V::K_LTE_SEL_RESEL_INFO, reselection(4, 9));
   EXPECT_EQ(row(validator.myLTE().EutraNbrs, 0),
             (Dictionary{{"earfcn", 1300u}, {"timestamp", kJuly14Text}}));
 }
@@ -284,9 +274,8 @@ TEST_F(LteCarrierAggregationTest, TurnsHundredthsOfADbIntoDbAndBandwidthCodesInt
                  .asDictionary()
                  ->find("rsrp"),
             Value(-10512));
-}
 
-TEST_F(LteCarrierAggregationTest, TruncatesLevelsTowardZeroAndDropsUnknownBandwidths) {
+  // Levels truncate toward zero; unknown bandwidth codes are dropped.
   deliver(V::K_LTE_CA_STATUS, status(-9850, 9));
   const Dictionary carrier = row(validator.myLTE().CAStatusList, 0);
   EXPECT_EQ(*carrier.find("rsrp"), Value(std::int64_t{-98}));
@@ -451,6 +440,11 @@ TEST_F(UmtsReselectionTest, RefreshesItsFixedKeysWithTextTimestampAndBands) {
     EXPECT_FALSE(copy.contains(list)) << list;
   }
   EXPECT_EQ(*validator.myUMTSSelReselDict()->find("timestamp"), Value(kJuly14Text));
+  // Only the priority lists the metric carries are filled.
+  const UMTS& umts = validator.myUMTS();
+  EXPECT_EQ(umts.eUtraNbrs, (List{Dictionary{{"earfcn", 1300u}, {"timestamp", kJuly14Text}}}));
+  EXPECT_EQ(umts.utraNbrs, (List{Dictionary{{"uarfcn", 10700u}, {"timestamp", kJuly14Text}}}));
+  EXPECT_EQ(umts.geraNbrs, placeholderList());
 }
 
 // Logged after the timestamp became text but before the bands do; the band text follows alone.
@@ -466,14 +460,6 @@ TEST_F(UmtsReselectionTest, LogsBetweenTheTimestampAndTheBandText) {
               ::testing::ElementsAre("Metric ID in Hex = 3CD104",
                                      "Received UMTS Cell Resel Info is " + logged.description(),
                                      "[1, 8]", "Received Valid Metric"));
-}
-
-TEST_F(UmtsReselectionTest, FillsOnlyThePriorityListsTheMetricCarries) {
-  deliver(V::K_UMTS_SEL_RESEL_INFO, reselection());
-  const UMTS& umts = validator.myUMTS();
-  EXPECT_EQ(umts.eUtraNbrs, (List{Dictionary{{"earfcn", 1300u}, {"timestamp", kJuly14Text}}}));
-  EXPECT_EQ(umts.utraNbrs, (List{Dictionary{{"uarfcn", 10700u}, {"timestamp", kJuly14Text}}}));
-  EXPECT_EQ(umts.geraNbrs, placeholderList());
 }
 
 class GsmNasConversionTest : public store::fixtures::StoreTest {};

@@ -58,6 +58,7 @@ TEST(AReader, ReadsAVarintOfAnyLengthAtAnyDistanceFromTheEndAndFlagsOneCutShort)
       Reader reader = over(bytes);
       EXPECT_EQ(reader.readVarint(), 0u) << length << " bytes cut to " << cut;
       EXPECT_TRUE(reader.hasError());
+      EXPECT_EQ(reader.readVarint(), 0u) << "zero from then on";
       EXPECT_EQ(reader.position(), cut);
     }
   }
@@ -74,15 +75,6 @@ TEST(AReader, YieldsZeroWithoutErrorForAVarintLongerThanTenBytes) {
     EXPECT_FALSE(reader.hasError());
     EXPECT_EQ(reader.position(), 10u) << "padding " << padding;
   }
-}
-
-TEST(AReader, FlagsAVarintCutShortAndYieldsZeroFromThenOn) {
-  const platform::Bytes bytes = {0x96};
-  Reader reader = over(bytes);
-  EXPECT_EQ(reader.readVarint(), 0u);
-  EXPECT_TRUE(reader.hasError());
-  EXPECT_EQ(reader.readVarint(), 0u);
-  EXPECT_EQ(reader.position(), 1u);
 }
 
 TEST(AReader, SkipsEveryWireTypeAValueCanHave) {
@@ -147,6 +139,15 @@ State stateOf(const Cursor& cursor, const platform::Bytes& bytes) {
   return {reader.position(), reader.length(), reader.hasError()};
 }
 
+// A cursor over its own bytes.
+struct CursorOver {
+  explicit CursorOver(platform::Bytes input) : bytes(std::move(input)) {}
+  State state() const { return stateOf(cursor, bytes); }
+  platform::Bytes bytes;
+  Reader reader{bytes};
+  Cursor cursor{reader};
+};
+
 // A record that reads varints to the end of what the reader lets it read.
 struct Varints {
   std::vector<std::uint64_t> values;
@@ -197,108 +198,93 @@ TEST(ACursor, ReadsVarintsAsTheReaderDoes) {
 }
 
 TEST(ACursor, ReadsAKeyCutShortAsAnEndGroupKeyWithTheErrorFlagSet) {
-  const platform::Bytes bytes = {0x08, 0x96};
-  Reader reader(bytes);
-  Cursor cursor(reader);
-  EXPECT_EQ(cursor.readKey(), 0x08u);
-  EXPECT_FALSE(cursor.hasError());
-  EXPECT_EQ(cursor.readKey(), kWireEndGroup);
-  EXPECT_EQ(stateOf(cursor, bytes), (State{2, 2, true}));
+  CursorOver over({0x08, 0x96});
+  EXPECT_EQ(over.cursor.readKey(), 0x08u);
+  EXPECT_FALSE(over.cursor.hasError());
+  EXPECT_EQ(over.cursor.readKey(), kWireEndGroup);
+  EXPECT_EQ(over.state(), (State{2, 2, true}));
 }
 
 TEST(ACursor, ReadsTextAndBytesOrNothingWhenCutShort) {
-  const platform::Bytes bytes = {0x02, 'h', 'i', 0x03, 0x00, 0xFF, 0x10, 0x04, 0x01};
-  Reader reader(bytes);
-  Cursor cursor(reader);
-  EXPECT_EQ(cursor.readString(), std::optional<std::string>("hi"));
-  EXPECT_EQ(cursor.readBytes(), std::optional<platform::Bytes>({0x00, 0xFF, 0x10}));
-  EXPECT_EQ(cursor.readBytes(), std::nullopt);
-  EXPECT_EQ(stateOf(cursor, bytes), (State{8, 9, true})) << "just past the length";
+  CursorOver over({0x02, 'h', 'i', 0x03, 0x00, 0xFF, 0x10, 0x04, 0x01});
+  EXPECT_EQ(over.cursor.readString(), std::optional<std::string>("hi"));
+  EXPECT_EQ(over.cursor.readBytes(), std::optional<platform::Bytes>({0x00, 0xFF, 0x10}));
+  EXPECT_EQ(over.cursor.readBytes(), std::nullopt);
+  EXPECT_EQ(over.state(), (State{8, 9, true})) << "just past the length";
+}
+
+std::uint32_t narrow(std::uint64_t value) {
+  return static_cast<std::uint32_t>(value);
+}
+
+std::vector<std::uint32_t> valuesOf(const PackedRun<std::uint32_t>& run) {
+  return {run.begin(), run.end()};
 }
 
 TEST(ACursor, ReadsAPackedRunWithinItsRegionOrASingleValueSentUnpacked) {
-  const platform::Bytes bytes = {0x03, 0x01, 0x96, 0x01, 0x07, 0x05};
-  Reader reader(bytes);
-  Cursor cursor(reader);
+  CursorOver over({0x03, 0x01, 0x96, 0x01, 0x07, 0x05});
   PackedRun<std::uint32_t> run;
-  const auto narrow = [](std::uint64_t value) { return static_cast<std::uint32_t>(value); };
-  ASSERT_TRUE(cursor.readPacked(kWireLengthDelimited, run, narrow));
-  ASSERT_TRUE(cursor.readPacked(kWireVarint, run, narrow));
-  EXPECT_EQ(std::vector<std::uint32_t>(run.begin(), run.end()),
-            (std::vector<std::uint32_t>{1, 150, 7}));
-  EXPECT_EQ(cursor.readVarint(), 5u);
-  EXPECT_EQ(stateOf(cursor, bytes), (State{6, 6, false}));
+  ASSERT_TRUE(over.cursor.readPacked(kWireLengthDelimited, run, narrow));
+  ASSERT_TRUE(over.cursor.readPacked(kWireVarint, run, narrow));
+  EXPECT_EQ(valuesOf(run), (std::vector<std::uint32_t>{1, 150, 7}));
+  EXPECT_EQ(over.cursor.readVarint(), 5u);
+  EXPECT_EQ(over.state(), (State{6, 6, false}));
 }
 
 TEST(ACursor, KeepsThePackedValuesReadBeforeTheInputWasCutShort) {
-  const auto narrow = [](std::uint64_t value) { return static_cast<std::uint32_t>(value); };
   // The second value runs past its region: appended as 0, the position at the region's end.
-  const platform::Bytes cutInside = {0x02, 0x04, 0x80, 0x05};
-  Reader reader(cutInside);
-  Cursor cursor(reader);
+  CursorOver cutInside({0x02, 0x04, 0x80, 0x05});
   PackedRun<std::uint32_t> run;
-  EXPECT_FALSE(cursor.readPacked(kWireLengthDelimited, run, narrow));
-  EXPECT_EQ(std::vector<std::uint32_t>(run.begin(), run.end()), (std::vector<std::uint32_t>{4, 0}));
-  EXPECT_EQ(stateOf(cursor, cutInside), (State{3, 4, true}));
+  EXPECT_FALSE(cutInside.cursor.readPacked(kWireLengthDelimited, run, narrow));
+  EXPECT_EQ(valuesOf(run), (std::vector<std::uint32_t>{4, 0}));
+  EXPECT_EQ(cutInside.state(), (State{3, 4, true}));
 
-  const platform::Bytes longRegion = {0x05, 0x01};
-  Reader longReader(longRegion);
-  Cursor longCursor(longReader);
+  CursorOver longRegion({0x05, 0x01});
   PackedRun<std::uint32_t> none;
-  EXPECT_FALSE(longCursor.readPacked(kWireLengthDelimited, none, narrow));
+  EXPECT_FALSE(longRegion.cursor.readPacked(kWireLengthDelimited, none, narrow));
   EXPECT_EQ(none.count(), 0u);
-  EXPECT_EQ(stateOf(longCursor, longRegion), (State{1, 2, true}));
+  EXPECT_EQ(longRegion.state(), (State{1, 2, true}));
 }
 
 TEST(ACursor, HandsANestedRecordTheReaderNarrowedToItsRegion) {
-  const platform::Bytes bytes = {0x02, 0x08, 0x01, 0x7F};
-  Reader reader(bytes);
-  Cursor cursor(reader);
+  CursorOver over({0x02, 0x08, 0x01, 0x7F});
   Varints nested;
-  ASSERT_TRUE(cursor.readNested(reader, nested));
+  ASSERT_TRUE(over.cursor.readNested(over.reader, nested));
   EXPECT_EQ(nested.values, (std::vector<std::uint64_t>{8, 1}));
   EXPECT_EQ(nested.readableLength, 3u);
-  EXPECT_EQ(cursor.readVarint(), 0x7Fu);
-  EXPECT_EQ(stateOf(cursor, bytes), (State{4, 4, false}));
+  EXPECT_EQ(over.cursor.readVarint(), 0x7Fu);
+  EXPECT_EQ(over.state(), (State{4, 4, false}));
 }
 
 TEST(ACursor, LeavesTheReaderWhereANestedRecordFailed) {
+  const auto readerState = [](const Reader& reader) {
+    return State{reader.position(), reader.length(), reader.hasError()};
+  };
   // Cut short inside the record: the reader stays as the record left it, inside the region.
-  const platform::Bytes cutInside = {0x02, 0x08, 0x80, 0x7F};
-  Reader reader(cutInside);
-  Cursor cursor(reader);
+  CursorOver cutInside({0x02, 0x08, 0x80, 0x7F});
   Varints nested;
-  EXPECT_FALSE(cursor.readNested(reader, nested));
+  EXPECT_FALSE(cutInside.cursor.readNested(cutInside.reader, nested));
   EXPECT_EQ(nested.values, (std::vector<std::uint64_t>{8, 0}));
-  EXPECT_EQ((State{reader.position(), reader.length(), reader.hasError()}), (State{3, 3, true}));
+  EXPECT_EQ(readerState(cutInside.reader), (State{3, 3, true}));
 
   // A region longer than what is left: the record reads nothing.
-  const platform::Bytes longRegion = {0x05, 0x01};
-  Reader longReader(longRegion);
-  Cursor longCursor(longReader);
+  CursorOver longRegion({0x05, 0x01});
   Varints none;
-  EXPECT_FALSE(longCursor.readNested(longReader, none));
+  EXPECT_FALSE(longRegion.cursor.readNested(longRegion.reader, none));
   EXPECT_TRUE(none.values.empty());
-  EXPECT_EQ((State{longReader.position(), longReader.length(), longReader.hasError()}),
-            (State{1, 2, true}));
+  EXPECT_EQ(readerState(longRegion.reader), (State{1, 2, true}));
 }
 
 TEST(ACursor, CountsTheValuesOfAKeyThatFollowOneAnotherWithoutMoving) {
   // After the key 0x82 0x01 (field 16, length-delimited): three values under it, then another.
-  const platform::Bytes bytes = {0x01, 0xAA, 0x82, 0x01, 0x00, 0x82, 0x01, 0x02,
-                                 0xBB, 0xCC, 0x8A, 0x01, 0x01, 0xDD, 0x82, 0x01};
-  Reader reader(bytes);
-  Cursor cursor(reader);
-  EXPECT_EQ(cursor.countAdjacent(130), 3u);
-  EXPECT_EQ(stateOf(cursor, bytes), (State{0, bytes.size(), false}));
+  CursorOver over({0x01, 0xAA, 0x82, 0x01, 0x00, 0x82, 0x01, 0x02, 0xBB, 0xCC, 0x8A, 0x01, 0x01,
+                   0xDD, 0x82, 0x01});
+  EXPECT_EQ(over.cursor.countAdjacent(130), 3u);
+  EXPECT_EQ(over.state(), (State{0, over.bytes.size(), false}));
 
   // A value whose length runs past the end still counts once its key is read.
-  const platform::Bytes cut = {0x01, 0xAA, 0x12, 0x05, 0xBB};
-  Reader cutReader(cut);
-  EXPECT_EQ(Cursor(cutReader).countAdjacent(0x12), 2u);
-  const platform::Bytes alone = {0x09};
-  Reader aloneReader(alone);
-  EXPECT_EQ(Cursor(aloneReader).countAdjacent(0x12), 1u);
+  EXPECT_EQ(CursorOver({0x01, 0xAA, 0x12, 0x05, 0xBB}).cursor.countAdjacent(0x12), 2u);
+  EXPECT_EQ(CursorOver({0x09}).cursor.countAdjacent(0x12), 1u);
 }
 
 TEST(AWriter, WritesEachScalarKindWithItsKey) {
@@ -367,27 +353,22 @@ TEST(APackedRun, RaisesARangeErrorNamingTheIndexAndTheCount) {
   }
 }
 
-TEST(APackedRun, ReplacesItsValuesWithACopy) {
+TEST(APackedRun, ReplacesItsValuesWithACopyAndComparesAndHashesByValue) {
   PackedRun<std::uint32_t> run;
   run.add(9);
   const std::uint32_t values[] = {1, 2, 3};
   run.set(values, 3);
-  EXPECT_EQ(run.count(), 3u);
-  EXPECT_EQ(run.values()[2], 3u);
+  EXPECT_EQ(valuesOf(run), (std::vector<std::uint32_t>{1, 2, 3}));
+  PackedRun<std::uint32_t> same;
+  for (const std::uint32_t value : values)
+    same.add(value);
+  EXPECT_EQ(run, same);
+  EXPECT_EQ(run.hash(), same.hash());
+  same.add(4);
+  EXPECT_NE(run, same);
+  EXPECT_NE(run.hash(), same.hash());
   run.set(nullptr, 5);
   EXPECT_EQ(run.count(), 0u);
-}
-
-TEST(APackedRun, ComparesAndHashesByValue) {
-  PackedRun<std::uint32_t> a;
-  PackedRun<std::uint32_t> b;
-  a.add(1);
-  b.add(1);
-  EXPECT_EQ(a, b);
-  EXPECT_EQ(a.hash(), b.hash());
-  b.add(2);
-  EXPECT_NE(a, b);
-  EXPECT_NE(a.hash(), b.hash());
 }
 
 TEST(APackedRun, BecomesAListOfNumbersOfItsOwnSignedness) {

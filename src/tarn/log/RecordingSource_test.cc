@@ -1,20 +1,15 @@
 #include "tarn/log/RecordingSource.h"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <chrono>
-#include <filesystem>
 #include <fstream>
-#include <future>
-#include <mutex>
 #include <sstream>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "platform/Log.h"
-#include "tarn/replay/ReplaySource.h"
 #include "tarn/testing/ScriptedMetricSource.h"
 
 namespace tarn::log {
@@ -52,17 +47,20 @@ std::vector<MetricLogEntry> entriesOf(const std::string& log) {
 
 class RecordingSourceTest : public ::testing::Test {
  protected:
-  // Emits `metrics` through a recording source, started `ago` before now, and answers what was
-  // handed on to the service.
+  // Emits `metrics` through a recording source into `log` (or log_), started `ago` before now, and
+  // answers what was handed on to the service; a log that cannot be written must have stopped it.
   std::vector<Metric> recordThrough(const std::vector<Metric>& metrics,
-                                    std::chrono::milliseconds ago = 0ms) {
-    RecordingSource recorder(scripted_, log_, "the log", RecordingSource::Clock::now() - ago);
+                                    std::chrono::milliseconds ago = 0ms,
+                                    std::ostream* log = nullptr, const char* name = "the log") {
+    std::ostream& into = log != nullptr ? *log : log_;
+    RecordingSource recorder(scripted_, into, name, RecordingSource::Clock::now() - ago);
     std::vector<Metric> handedOn;
     recorder.start([&handedOn](Metric metric) { handedOn.push_back(std::move(metric)); });
     for (const Metric& metric : metrics)
       scripted_->emit(metric);
     scripted_->flush();
     recorder.stop();
+    EXPECT_EQ(recorder.writeFailed(), into.fail());
     return handedOn;
   }
 
@@ -96,44 +94,10 @@ TEST_F(RecordingSourceTest, PassesQueriesThroughWithoutRecordingThem) {
   EXPECT_TRUE(log_.str().empty());
 }
 
-TEST_F(RecordingSourceTest, ReplayingTheRecordingDeliversTheSameMetricsInTheSameOrder) {
-  recordThrough(kMetrics);
-  const std::filesystem::path path = std::filesystem::temp_directory_path() /
-                                     ("norvo-recording-" + std::to_string(::getpid()) + ".jsonl");
-  std::ofstream(path, std::ios::binary | std::ios::trunc) << log_.str();
-
-  std::ostringstream errors;
-  replay::ReplaySource replay(path.string(), {.speed = std::nullopt, .loop = false}, errors);
-  std::filesystem::remove(path);
-  EXPECT_TRUE(errors.str().empty()) << errors.str();
-
-  std::mutex mutex;
-  std::vector<Metric> replayed;
-  std::promise<void> done;
-  replay.start([&](Metric metric) {
-    const std::lock_guard lock(mutex);
-    replayed.push_back(std::move(metric));
-    if (replayed.size() == kMetrics.size()) done.set_value();
-  });
-  ASSERT_EQ(done.get_future().wait_for(5s), std::future_status::ready);
-  replay.stop();
-  EXPECT_EQ(plain(replayed), plain(kMetrics));
-}
-
-TEST(ARecordingSource, StopsRecordingAtOnceWithAWarningWhenTheLogCannotBeWritten) {
+TEST_F(RecordingSourceTest, StopsRecordingAtOnceWithAWarningWhenTheLogCannotBeWritten) {
   platform::log::Capture log;
-  const auto scripted = std::make_shared<testing::ScriptedMetricSource>();
   std::ofstream full("/dev/full");
-  RecordingSource recorder(scripted, full, "/dev/full");
-  std::vector<Metric> handedOn;
-  recorder.start([&handedOn](Metric metric) { handedOn.push_back(std::move(metric)); });
-  for (const Metric& metric : kMetrics)
-    scripted->emit(metric);
-  scripted->flush();
-  recorder.stop();
-
-  EXPECT_TRUE(recorder.writeFailed());
-  EXPECT_EQ(plain(handedOn), plain(kMetrics));
+  EXPECT_EQ(plain(recordThrough(kMetrics, 0ms, &full, "/dev/full")), plain(kMetrics));
   EXPECT_EQ(log.systemLines(),
             std::vector<std::string>{"cannot write /dev/full (No space left on device); recording "
                                      "stopped"});

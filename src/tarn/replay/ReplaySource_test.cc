@@ -44,6 +44,13 @@ class ReplaySourceTest : public ::testing::Test {
     return path;
   }
 
+  // A source over a log of `contents`, started on the test's clock.
+  std::unique_ptr<ReplaySource> started(const std::string& contents, ReplayOptions options) {
+    auto source = std::make_unique<ReplaySource>(writeLog(contents), options, errors_, clock);
+    startRecording(*source);
+    return source;
+  }
+
   // The metric IDs delivered, with the clock's time since start() at each.
   struct Delivered {
     std::uint32_t metricId;
@@ -76,6 +83,7 @@ class ReplaySourceTest : public ::testing::Test {
   std::shared_ptr<tarn::testing::ManualClock> clock =
       std::make_shared<tarn::testing::ManualClock>();
   std::filesystem::path directory_;
+  std::ostringstream errors_;
   std::mutex mutex_;
   std::condition_variable arrived_;
   std::vector<Delivered> delivered_;
@@ -83,10 +91,7 @@ class ReplaySourceTest : public ::testing::Test {
 
 TEST_F(ReplaySourceTest, DeliversTheLogInOrderAtItsTimesScaledBySpeed) {
   // 2000 ms of log at speed 20: 100 ms on the clock.
-  const std::string path = writeLog(line(1, 0) + line(2, 1000) + line(3, 2000));
-  std::ostringstream errors;
-  ReplaySource source(path, {.speed = 20.0, .loop = false}, errors, clock);
-  startRecording(source);
+  const auto source = started(line(1, 0) + line(2, 1000) + line(3, 2000), {.speed = 20.0});
   clock->awaitWaiter();
   EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
   clock->advance(49ms);
@@ -101,29 +106,26 @@ TEST_F(ReplaySourceTest, DeliversTheLogInOrderAtItsTimesScaledBySpeed) {
   EXPECT_EQ(delivered[0].after, 0ms);
   EXPECT_EQ(delivered[1].after, 50ms);
   EXPECT_EQ(delivered[2].after, 100ms);
-  EXPECT_TRUE(errors.str().empty());
+  EXPECT_TRUE(errors_.str().empty());
 }
 
-TEST_F(ReplaySourceTest, WithoutSpeedDeliversEverythingAtOnceIgnoringTheGaps) {
-  const std::string path = writeLog(line(1, 0) + line(2, 3'600'000) + line(3, 7'200'000));
-  std::ostringstream errors;
-  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors, clock);
-  startRecording(source);
+TEST_F(ReplaySourceTest, WithoutSpeedDeliversEverythingAtOnceIgnoringTheGapsAndOnlyOnce) {
+  const auto source =
+      started(line(1, 0) + line(2, 3'600'000) + line(3, 7'200'000), {.speed = std::nullopt});
   EXPECT_EQ(ids(waitFor(3)), (std::vector<std::uint32_t>{1, 2, 3}));
+  source->stop();  // the worker has ended on its own, or ends now
+  EXPECT_EQ(waitFor(0).size(), 3u);
 }
 
 TEST_F(ReplaySourceTest, LoopingStartsOverAfterTheLastMetricAndStopsOnlyWhenAsked) {
-  const std::string path = writeLog(line(1, 0) + line(2, 10));
-  std::ostringstream errors;
-  ReplaySource source(path, {.speed = 10.0, .loop = true}, errors, clock);
-  startRecording(source);
+  const auto source = started(line(1, 0) + line(2, 10), {.speed = 10.0, .loop = true});
   // Each pass carries on 1 ms after the last: 1 at 0, 2 at 1, 1 at 1, 2 at 2, 1 at 2...
   for (int ms = 0; ms < 3; ++ms) {
     clock->awaitWaiter();
     clock->advance(1ms);
   }
   const std::vector<Delivered> delivered = waitFor(5);
-  source.stop();
+  source->stop();
   EXPECT_EQ(ids(delivered).at(2), 1u);
   EXPECT_EQ(ids(delivered).at(3), 2u);
   EXPECT_EQ(ids(delivered).at(4), 1u);
@@ -132,16 +134,6 @@ TEST_F(ReplaySourceTest, LoopingStartsOverAfterTheLastMetricAndStopsOnlyWhenAske
   const std::size_t afterStop = waitFor(0).size();
   clock->advance(1h);
   EXPECT_EQ(waitFor(0).size(), afterStop);
-}
-
-TEST_F(ReplaySourceTest, WithoutLoopingDeliversTheLogOnce) {
-  const std::string path = writeLog(line(1, 0) + line(2, 1));
-  std::ostringstream errors;
-  ReplaySource source(path, {.speed = std::nullopt, .loop = false}, errors, clock);
-  startRecording(source);
-  waitFor(2);
-  source.stop();  // the worker has ended on its own, or ends now
-  EXPECT_EQ(waitFor(0).size(), 2u);
 }
 
 TEST_F(ReplaySourceTest, ReportsBrokenLinesWithTheirNumbersAndReplaysTheRest) {
@@ -171,12 +163,9 @@ TEST_F(ReplaySourceTest, ReportsBrokenLinesWithTheirNumbersAndReplaysTheRest) {
 
 // The clock never reaches the second metric: stop() must not wait for it.
 TEST_F(ReplaySourceTest, StopsInTheMiddleOfALongGap) {
-  const std::string path = writeLog(line(1, 0) + line(2, 3'600'000));
-  std::ostringstream errors;
-  ReplaySource source(path, {.speed = 1.0, .loop = false}, errors, clock);
-  startRecording(source);
+  const auto source = started(line(1, 0) + line(2, 3'600'000), {.speed = 1.0});
   clock->awaitWaiter();
-  source.stop();
+  source->stop();
   EXPECT_EQ(ids(waitFor(0)), (std::vector<std::uint32_t>{1}));
 }
 

@@ -8,6 +8,7 @@
 #include <iterator>
 #include <string>
 
+#include "messages/Metrics.h"
 #include "platform/Log.h"
 #include "tarn/Ipc.h"
 #include "tarn/Names.h"
@@ -62,8 +63,6 @@ class Session {
     }
     client::EventsOn(manager_);
   }
-  ~Session() { manager_.reset(); }
-
   const std::shared_ptr<client::Manager>& manager() const { return manager_; }
 
   // Waits for `count` events in all and answers every event received so far.
@@ -358,20 +357,13 @@ TEST(AConfiguration, NamesTheLineAndTheFaultOfAMalformedText) {
             "the configuration is 1048580 bytes long; it may be at most 1048576");
 }
 
-TEST(TheShippedConfiguration, SubscribesToEveryMetricThatTheIntakeKnows) {
+TEST(TheShippedConfiguration, SubscribesToEveryMetric) {
   std::ifstream file(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig", std::ios::binary);
   const std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
   const Configuration configuration = Configuration::parse(text);
-
-  const std::uint32_t intakeMetrics[] = {
-      0x3C4E18, 0x3C4E04, 0x3C40C2, 0x3C4E25, 0x3CD30E, 0x3CD301, 0x3CD302, 0x3C4F6A,
-      0x3CD30B, 0x3CD313, 0x3CD310, 0x3CD30F, 0x3CD317, 0x3CD509, 0x3CD50D, 0x3CD50C,
-      0x3CD50A, 0x3CD50B, 0x3CD112, 0x3CD113, 0x3C300C, 0x3CD102, 0x3CD103, 0x3CD104,
-      0x3CD105, 0x3C2E0C, 0x3CD001, 0x3CD002, 0x3CD003, 0x3CD009, 0x3CD00C, 0x3C0013};
-  EXPECT_EQ(configuration.size(), std::size(intakeMetrics));
-  for (const std::uint32_t metricId : intakeMetrics) {
-    EXPECT_TRUE(configuration.profileOf(metricId)) << std::hex << metricId;
-  }
+  EXPECT_EQ(configuration.size(), messages::kMetricKinds.size());
+  for (const messages::MetricKind& kind : messages::kMetricKinds)
+    EXPECT_TRUE(configuration.profileOf(kind.metricID)) << kind.name;
 }
 
 }  // namespace

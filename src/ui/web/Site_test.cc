@@ -25,10 +25,10 @@ class ASite : public ::testing::Test {
   ~ASite() override { testData() = {}; }
 
   Response get(const std::string& target, const std::string& host = "127.0.0.1:8080",
-               http::verb method = http::verb::get) {
+               http::verb method = http::verb::get, Site* answering = nullptr) {
     Request request(method, target, 11);
     if (!host.empty()) request.set(http::field::host, host);
-    return site.handle(request);
+    return (answering != nullptr ? *answering : site).handle(request);
   }
 
   json::value getJson(std::string target) {
@@ -224,9 +224,7 @@ class ASiteWithPagesOfItsOwn : public ASite {
       pages, {false, {}, {{"echo", &echo}}, {{"/dashboard", "dashboard.html", "Dashboard"}}, {}}};
 
   Response getFrom(Site& answering, const std::string& target) {
-    Request request(http::verb::get, target, 11);
-    request.set(http::field::host, "localhost");
-    return answering.handle(request);
+    return get(target, "localhost", http::verb::get, &answering);
   }
 };
 
@@ -284,12 +282,6 @@ TEST(OpenPages, CloseTheLeastRecentlyAskedForPageWhenFull) {
   EXPECT_FALSE(pages.isOpen({"Alpha"}));
   EXPECT_TRUE(pages.isOpen({"Beta"}));
 }
-
-}  // namespace
-}  // namespace ui::web
-
-namespace ui::web {
-namespace {
 
 // Pages shown beyond loopback, to holders of the token "s3cret" only.
 class AGuardedSite : public ASite {

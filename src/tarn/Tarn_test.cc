@@ -120,20 +120,6 @@ class AService : public ::testing::Test {
   std::shared_ptr<client::Manager> commander;
 };
 
-TEST_F(AService, DeliversOnlyTheSubscribedMetricsAsRecordsUnderTheirProfile) {
-  Session app("vexmora", queue, inProcess);
-  ASSERT_EQ(configure("profile 7\n0x3C4E04\n"), CommandResult{});
-
-  source->emit({kCaStatus, {9}});
-  source->emit({kRrcState, {1, 2}});
-  const std::vector<Event> events = app.waitFor(1);
-
-  ASSERT_EQ(events.size(), 1u);
-  EXPECT_EQ(events[0].name, kEventMetric);
-  EXPECT_EQ(events[0].record, metricRecord(kRrcState, {1, 2}, 7));
-  EXPECT_EQ(events[0].record.asDictionary()->begin()->first, "kKeyMetricID");
-}
-
 TEST_F(AService, ReplacesAConfigurationForgetsAClearedOneAndAnswersQueriesRegardless) {
   Session app("vexmora", queue, inProcess);
   source->answerQueriesWith({kSimFiles, {5}});
@@ -182,46 +168,6 @@ TEST_F(AService, SendsEventsOnlyToTheAppsSessionsWhoseEventsAreOn) {
 
   EXPECT_TRUE(silenced.waitFor(0).empty());
   EXPECT_TRUE(stranger.waitFor(0).empty());
-}
-
-TEST_F(AService, RefusesEveryFaultyCommandWithAStatusAndAMessageThatNamesTheFault) {
-  const struct {
-    std::string_view command;
-    Object input;
-    CommandResult result;
-  } cases[] = {
-      {"Reboot", withAppId({}), {status::kUnknownCommand, "unknown command 'Reboot'"}},
-      {kCommandClearConfiguration,
-       Object::integer(2),
-       {status::kInvalidArgument, "the command's arguments are not a dictionary"}},
-      {kCommandClearConfiguration,
-       Object::dictionary({entry(kKeyAppID, Object())}),
-       {status::kMissingArgument, "missing argument kKeyAppID"}},
-      {kCommandClearConfiguration,
-       Object::dictionary({entry(kKeyAppID, Object::text("2"))}),
-       {status::kInvalidArgument, "argument kKeyAppID is not an integer"}},
-      {kCommandClearConfiguration,
-       Object::dictionary({entry(kKeyAppID, Object::integer(7))}),
-       {status::kUnknownAppId, "unknown app ID 7"}},
-      {kCommandAddConfiguration,
-       withAppId({entry(kKeyPayload, bytesOf("0x1\n0xZZ\n"))}),
-       {status::kMalformedConfiguration,
-        "malformed configuration: line 2: '0xZZ' is not a metric ID; write metric IDs in hex, "
-        "like 0x3C4E04"}},
-      {kCommandAddConfiguration,
-       withAppId({entry(kKeyPayload, bytesOf("0x1")), entry(kKeyPayloadType, Object::integer(1))}),
-       {status::kInvalidArgument, "unsupported payload type 1"}},
-      {kCommandQueryMetric,
-       withAppId({entry(kKeyTriggerID, Object::integer(0x3C0013))}),
-       {status::kInvalidArgument,
-        "trigger ID 0x3C0013 asks for no metric; on-demand triggers run from 0x7F0000 to "
-        "0x7FFFFF"}},
-      {kCommandQueryMetric,
-       withAppId({entry(kKeyTriggerID, Object::integer(0x7F4E04))}),
-       {status::kNoSuchMetric, "the baseband has no metric 0x3C4E04 to report"}},
-  };
-  for (const auto& faulty : cases)
-    EXPECT_EQ(perform(faulty.command, faulty.input), faulty.result);
 }
 
 TEST(ARecordedDrive, StartsOnceASessionHasItsEventsOnAndItsAppConfiguredInEitherOrder) {

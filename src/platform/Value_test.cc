@@ -7,6 +7,8 @@
 #include <limits>
 #include <ostream>
 
+#include "platform/Json.h"
+
 namespace platform {
 
 // Failure messages show values in their text form.
@@ -212,6 +214,37 @@ TEST(AValueDescription, IsTheSameForAContainerAloneAndInsideAValue) {
   const Dictionary dictionary{{"a", list}};
   EXPECT_EQ(description(list), Value(list).description());
   EXPECT_EQ(dictionary.description(), Value(dictionary).description());
+}
+
+TEST(TheJsonEncoder, WritesEachValueInItsJsonForm) {
+  const std::string r = "\xEF\xBF\xBD";  // the replacement character
+  const std::string utf8 =
+      "\xC3\xA9 \xE2\x82\xAC \xF0\x9F\x93\xB6 \xF4\x8F\xBF\xBF";  // é € 📶 U+10FFFF
+  const Dictionary nested{{"z", 1}, {"a", List{Dictionary{}, List{}}}, {"m", "x"}};
+  const std::pair<Value, std::string> cases[] = {
+      {std::numeric_limits<std::int64_t>::min(), "-9223372036854775808"},
+      {std::numeric_limits<std::uint64_t>::max(), "18446744073709551615"},
+      {5.0, "5.0"},
+      {-1e-7, "-1e-07"},
+      {List{INFINITY, -INFINITY, std::nan("")}, "[null,null,null]"},
+      {List{true, false, Value()}, "[true,false,null]"},
+      {Bytes{0x0a, 0xff, 0x00, 0x10, 0x20}, R"("0aff001020")"},
+      {nested, R"({"z":1,"a":[{},[]],"m":"x"})"},
+      {R"(a"b\c)", R"("a\"b\\c")"},
+      {std::string("\n\t\x01\x1f\x7f/", 6), "\"\\u000a\\u0009\\u0001\\u001f\x7f/\""},
+      {std::string("a\0b", 3), R"("a\u0000b")"},
+      {utf8, "\"" + utf8 + "\""},
+      // Each ill-formed UTF-8 subpart becomes one replacement character.
+      {"a\x80z", "\"a" + r + "z\""},                      // lone continuation
+      {"a\xE2\x82", "\"a" + r + "\""},                    // truncated at the end
+      {"\xC0\xAF", "\"" + r + r + "\""},                  // overlong
+      {"\xED\xA0\x80", "\"" + r + r + r + "\""},          // surrogate
+      {"\xF4\x90\x80\x80", "\"" + r + r + r + r + "\""},  // above U+10FFFF
+      {"\xFF\xFE", "\"" + r + r + "\""},
+  };
+  for (const auto& [value, json] : cases)
+    EXPECT_EQ(toJson(value), json) << value.description();
+  EXPECT_EQ(toJson(nested), toJson(Value(nested)));
 }
 
 }  // namespace

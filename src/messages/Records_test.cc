@@ -99,25 +99,17 @@ TEST(ARecord, WithoutTheTagRuleSkipsAMetricIdFieldSilentlyAndKeepsFullFieldNumbe
   EXPECT_TRUE(capture.plainLines().empty());
 }
 
-TEST(ARecord, WrapsFieldNumbersAtSixteenBits) {
-  const auto rrc = decode<KCellularLteRrcState>(Payload().varint(65537, 42).data());
-  EXPECT_EQ(rrc->timestamp(), 42u);
-}
+TEST(ARecord, WrapsFieldNumbersStopsAtAnEndGroupAndTakesScalarsAndPackedRunsAsSent) {
+  EXPECT_EQ(decode<KCellularLteRrcState>(Payload().varint(65537, 42).data())->timestamp(), 42u);
 
-TEST(ARecord, StopsAtAnEndGroupKeyWithSuccess) {
-  const auto rrc =
+  const auto ended =
       decode<KCellularLteRrcState>(Payload().varint(1, 5).raw({0x0C}).varint(2, 3).data());
-  EXPECT_EQ(rrc->timestamp(), 5u);
-  EXPECT_FALSE(rrc->hasState());
-}
+  EXPECT_EQ(ended->timestamp(), 5u);
+  EXPECT_FALSE(ended->hasState());
 
-TEST(ARecord, ReadsAKnownScalarAsAVarintWhateverItsWireType) {
-  const Bytes payload = {(4 << 3) | 2, 0x05};
-  const auto rrc = decode<KCellularLteRrcState>(payload);
-  EXPECT_EQ(rrc->prevStateDurMs(), 5u);
-}
+  // A known scalar is read as a varint whatever its wire type.
+  EXPECT_EQ(decode<KCellularLteRrcState>({(4 << 3) | 2, 0x05})->prevStateDurMs(), 5u);
 
-TEST(ARecord, AcceptsAPackedFieldSentUnpacked) {
   const auto rf = decode<KCellularGsmCsRfMeasurement>(Payload().varint(5, 3).varint(5, 4).data());
   EXPECT_EQ(Value(rf->dictionaryRepresentation()).description(), "[\"cs_tx_pwr\": [-2, 2]]");
 }

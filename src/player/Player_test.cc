@@ -146,7 +146,8 @@ TEST(PlayerSeek, RebuildsWhatAnIntakeOfTheLogUpToThatTimeBuilds) {
   constexpr std::uint64_t kStartMs = 1718100000000;
   tarn::sim::Simulator simulator(7, kStartMs);
   Drive drive;
-  for (tarn::sim::TimedMetric& timed : simulator.advance(8 * 60 * 1000)) {
+  // LTE, then UMTS from 155 s, GSM from 217 s, and LTE again from 403 s.
+  for (tarn::sim::TimedMetric& timed : simulator.advance(410 * 1000)) {
     drive.metrics.push_back({static_cast<std::int64_t>(timed.atMs - kStartMs),
                              {{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
                               {"kKeyPayload", std::move(timed.metric.payload)}}});
@@ -199,8 +200,10 @@ TEST(PlayerSeek, RebuildsWhatAnIntakeOfTheLogUpToThatTimeBuilds) {
   player.play();
   player.deliverDue(100000);
 
+  // Each seek rebuilds from the start: forward onto GSM, back onto LTE, to the start, to the end
+  // back on LTE, and back onto UMTS.
+  const std::int64_t seeks[] = {300'000, 42'000, 0, 409'900, 180'500};
   // What an intake of the log up to each time holds, taken in one pass over the log.
-  const std::int64_t seeks[] = {300'000, 42'000, 0, 479'900, 120'500, 300'000};
   std::map<std::int64_t, std::vector<std::string>> upTo;
   for (const std::int64_t seekTo : seeks)
     upTo[seekTo];

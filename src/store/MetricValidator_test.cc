@@ -180,6 +180,50 @@ TEST_F(MetricValidatorTest, KeepsATimestampThatNoCalendarShowsAsItsNumber) {
   EXPECT_EQ(*validator.myLTERRCStateDict()->find("timestamp"), Value(UINT64_MAX));
 }
 
+// A row is its element's entries in their order, then those it takes over from its metric, and
+// the rows of each metric are written over the last ones whatever their shape was.
+TEST_F(MetricValidatorTest, WritesEachRowAsItsElementThenWhatItTakesOverFromItsMetric) {
+  using messages::KCellularWcdmaScellMeasurement;
+  using messages::RxInfo;
+  const auto rowTexts = [this] {
+    std::vector<std::string> texts;
+    for (const Value& row : validator.myUMTS().rXInfo)
+      texts.push_back(row.description());
+    return texts;
+  };
+  KCellularWcdmaScellMeasurement first;
+  first.setTimestamp(kJuly14);
+  first.setConnectedMode(true);
+  for (const std::int32_t rssi : {-70, -72, -74}) {
+    auto info = std::make_shared<RxInfo>();
+    info->setRssi(rssi);
+    info->setSnr(rssi + 80);
+    first.addRxInfo(info);
+  }
+  deliver(MetricValidator::K_UMTS_SCELL_MEAS, first);
+  KCellularWcdmaScellMeasurement second;
+  second.setTimestamp(kJuly14 + 1000);
+  for (const std::uint32_t range : {3u, 4u}) {
+    auto info = std::make_shared<RxInfo>();
+    info->setRsrpRange(range);
+    info->setRsrqRange(range + 1);
+    second.addRxInfo(info);
+  }
+  deliver(MetricValidator::K_UMTS_SCELL_MEAS, second);
+  EXPECT_THAT(rowTexts(), ElementsAre(R"(["rsrp_range": 3, "rsrq_range": 4, )"
+                                      R"("timestamp": "2017-07-14 02:40:01 UTC"])",
+                                      R"(["rsrp_range": 4, "rsrq_range": 5, )"
+                                      R"("timestamp": "2017-07-14 02:40:01 UTC"])"));
+  deliver(MetricValidator::K_UMTS_SCELL_MEAS, first);
+  EXPECT_THAT(rowTexts(),
+              ElementsAre(R"(["rssi": -70, "snr": 10, "timestamp": "2017-07-14 02:40:00 UTC", )"
+                          R"("connected_mode": 1])",
+                          R"(["rssi": -72, "snr": 8, "timestamp": "2017-07-14 02:40:00 UTC", )"
+                          R"("connected_mode": 1])",
+                          R"(["rssi": -74, "snr": 6, "timestamp": "2017-07-14 02:40:00 UTC", )"
+                          R"("connected_mode": 1])"));
+}
+
 struct Route {
   std::int64_t metricID;
   const char* recordClass;

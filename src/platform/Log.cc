@@ -119,10 +119,12 @@ namespace {
 //
 // Lines travel in slots that go back and forth between the writers and the WriterThread: a
 // batch once written comes back as the slots of the next lines, whose writers copy their text
-// into the storage of the written line's text and let go of its dictionary themselves. So a busy
-// intake neither allocates a line's text nor has the blocks it allocated freed on another thread,
-// where they would fill that thread's cache of freed blocks and leave its own empty. A writer
-// that has had no line for a while lets go of what the written lines still hold.
+// into the storage of the written line's text. So a busy intake does not allocate a line's text,
+// nor have it freed on the other thread, where it would fill that thread's cache of freed blocks
+// and leave its own empty. The WriterThread lets go of a described line's dictionary once it has
+// written the line: the main queue is spared freeing the dictionaries that metrics replace, whose
+// memory has gone cold by then. A WriterThread that has had no line for a while lets go of the
+// slots' texts.
 class LineQueue {
  public:
   static LineQueue& instance() {
@@ -154,7 +156,6 @@ class LineQueue {
   // False, having queued nothing, when no writer runs: the caller writes the line itself.
   bool push(Channel channel, std::string_view text, std::string_view prefix,
             std::shared_ptr<const Dictionary>&& described) {
-    std::shared_ptr<const Dictionary> written;
     std::unique_lock lock(mutex_);
     if (!running_) return false;
     roomMade_.wait(lock, [this] { return waitingCount_ < capacity_ || !running_; });
@@ -167,7 +168,7 @@ class LineQueue {
     slot.text.clear();
     slot.text.append(text);
     slot.prefix = prefix;
-    written = std::exchange(slot.described, std::move(described));
+    slot.described = std::move(described);
     ++queued_;
     const bool wake = writerWaiting_ && (waitingCount_ == 1 || waitingCount_ == hurryAt());
     lock.unlock();
@@ -197,7 +198,7 @@ class LineQueue {
       writerWaiting_ = true;
       const auto lineOrStop = [this] { return waitingCount_ > 0 || stopping_; };
       if (!lineQueued_.wait_for(lock, kIdleRelease, lineOrStop)) {
-        // Quiet for a while: let go of what the written lines hold.
+        // Quiet for a while: let go of the written lines' texts.
         waiting_.clear();
         lock.unlock();
         batch.clear();
@@ -215,8 +216,10 @@ class LineQueue {
       const std::size_t count = std::exchange(waitingCount_, 0);
       lock.unlock();
       roomMade_.notify_all();
-      for (std::size_t i = 0; i < count; ++i)
+      for (std::size_t i = 0; i < count; ++i) {
         channels.write(batch[i], scratch);
+        batch[i].described.reset();
+      }
       lock.lock();
       written_ += count;
       linesWritten_.notify_all();

@@ -26,11 +26,11 @@ bool isTerminal(std::FILE* output) {
 
 enum class Channel : std::uint8_t { Plain, System, Warning };
 
-// One line on its way out.
+// One line on its way out: `text`, or for a described line `prefix` followed by the text form of
+// `described`, made when written.
 struct Line {
   Channel channel = Channel::Plain;
   std::string text;
-  // A described line is `prefix` followed by the text form of `described`, made when written.
   std::string_view prefix;
   std::shared_ptr<const Dictionary> described;
 };
@@ -73,12 +73,15 @@ struct Channels {
     }
   }
 
-  void write(Line& line) {
-    if (line.described) {
-      line.text.assign(line.prefix);
-      appendDescription(line.text, *line.described);
+  // `scratch` holds the text of a described line.
+  void write(const Line& line, std::string& scratch) {
+    if (!line.described) {
+      write(line.channel, line.text);
+      return;
     }
-    write(line.channel, line.text);
+    scratch.assign(line.prefix);
+    appendDescription(scratch, *line.described);
+    write(line.channel, scratch);
   }
 
  private:
@@ -113,6 +116,15 @@ namespace {
 
 // The lines waiting for the WriterThread. The writer takes all that wait at once, so at most
 // twice the capacity is held: those waiting and those being written.
+//
+// Lines travel in slots that go back and forth between the writers and the WriterThread: a
+// batch once written comes back as the slots of the next lines, whose writers copy their text
+// into the storage of the written line's text. So a busy intake does not allocate a line's text,
+// nor have it freed on the other thread, where it would fill that thread's cache of freed blocks
+// and leave its own empty. The WriterThread lets go of a described line's dictionary once it has
+// written the line: the main queue is spared freeing the dictionaries that metrics replace, whose
+// memory has gone cold by then. A WriterThread that has had no line for a while lets go of the
+// slots' texts.
 class LineQueue {
  public:
   static LineQueue& instance() {
@@ -142,14 +154,23 @@ class LineQueue {
   }
 
   // False, having queued nothing, when no writer runs: the caller writes the line itself.
-  bool push(Line&& line) {
+  bool push(Channel channel, std::string_view text, std::string_view prefix,
+            std::shared_ptr<const Dictionary>&& described) {
     std::unique_lock lock(mutex_);
     if (!running_) return false;
-    roomMade_.wait(lock, [this] { return waiting_.size() < capacity_ || !running_; });
+    roomMade_.wait(lock, [this] { return waitingCount_ < capacity_ || !running_; });
     if (!running_) return false;
-    waiting_.push_back(std::move(line));
+    if (waitingCount_ == waiting_.size()) waiting_.emplace_back();
+    Line& slot = waiting_[waitingCount_++];
+    slot.channel = channel;
+    // Appending to the emptied text copies it into the storage it has, where assign() would
+    // take the general path of replace().
+    slot.text.clear();
+    slot.text.append(text);
+    slot.prefix = prefix;
+    slot.described = std::move(described);
     ++queued_;
-    const bool wake = writerWaiting_ && (waiting_.size() == 1 || waiting_.size() == hurryAt());
+    const bool wake = writerWaiting_ && (waitingCount_ == 1 || waitingCount_ == hurryAt());
     lock.unlock();
     if (wake) lineQueued_.notify_one();
     return true;
@@ -171,28 +192,39 @@ class LineQueue {
   void writeUntilStopped() {
     Channels& channels = Channels::instance();
     std::vector<Line> batch;
+    std::string scratch;
     std::unique_lock lock(mutex_);
     for (;;) {
       writerWaiting_ = true;
-      lineQueued_.wait(lock, [this] { return !waiting_.empty() || stopping_; });
+      const auto lineOrStop = [this] { return waitingCount_ > 0 || stopping_; };
+      if (!lineQueued_.wait_for(lock, kIdleRelease, lineOrStop)) {
+        // Quiet for a while: let go of the written lines' texts.
+        waiting_.clear();
+        lock.unlock();
+        batch.clear();
+        lock.lock();
+        lineQueued_.wait(lock, lineOrStop);
+      }
       // Waking for every line would cost the writers more than the lines themselves: the first
       // line waits a little for others to join it, unless the queue fills or someone waits.
       lineQueued_.wait_for(lock, kGathering, [this] {
-        return waiting_.size() >= hurryAt() || stopping_ || draining_ > 0;
+        return waitingCount_ >= hurryAt() || stopping_ || draining_ > 0;
       });
       writerWaiting_ = false;
-      if (waiting_.empty()) break;
+      if (waitingCount_ == 0) break;
       batch.swap(waiting_);
+      const std::size_t count = std::exchange(waitingCount_, 0);
       lock.unlock();
       roomMade_.notify_all();
-      for (Line& line : batch)
-        channels.write(line);
-      const std::size_t count = batch.size();
-      batch.clear();
+      for (std::size_t i = 0; i < count; ++i) {
+        channels.write(batch[i], scratch);
+        batch[i].described.reset();
+      }
       lock.lock();
       written_ += count;
       linesWritten_.notify_all();
     }
+    waiting_.clear();
     running_ = false;
     roomMade_.notify_all();
     linesWritten_.notify_all();
@@ -201,12 +233,15 @@ class LineQueue {
   std::size_t hurryAt() const { return (capacity_ + 1) / 2; }
 
   static constexpr auto kGathering = std::chrono::milliseconds(10);
+  static constexpr auto kIdleRelease = std::chrono::seconds(1);
 
   std::mutex mutex_;
   std::condition_variable lineQueued_;
   std::condition_variable roomMade_;
   std::condition_variable linesWritten_;
+  // The first waitingCount_ slots wait; the others are written lines to write over.
   std::vector<Line> waiting_;
+  std::size_t waitingCount_ = 0;
   std::size_t capacity_ = 1;
   std::uint64_t queued_ = 0;
   std::uint64_t written_ = 0;
@@ -217,15 +252,15 @@ class LineQueue {
   std::thread writer_;
 };
 
-void emit(Line&& line) {
-  if (!LineQueue::instance().push(std::move(line))) Channels::instance().write(line);
-}
-
-void emit(Channel channel, std::string_view text) {
-  Line line;
-  line.channel = channel;
-  line.text = text;
-  emit(std::move(line));
+void emit(Channel channel, std::string_view text, std::string_view prefix = {},
+          std::shared_ptr<const Dictionary> described = nullptr) {
+  if (LineQueue::instance().push(channel, text, prefix, std::move(described))) return;
+  if (!described) {
+    Channels::instance().write(channel, text);
+    return;
+  }
+  std::string scratch;
+  Channels::instance().write(Line{channel, {}, prefix, std::move(described)}, scratch);
 }
 
 std::atomic<int> silences{0};
@@ -260,11 +295,7 @@ void warning(std::string_view line) {
 
 void plainDescribed(std::string_view prefix, std::shared_ptr<const Dictionary> described) {
   if (silenced()) return;
-  Line line;
-  line.channel = Channel::Plain;
-  line.prefix = prefix;
-  line.described = std::move(described);
-  emit(std::move(line));
+  emit(Channel::Plain, {}, prefix, std::move(described));
 }
 
 void setPlainOutput(std::FILE* output) {

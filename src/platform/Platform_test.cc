@@ -142,6 +142,41 @@ TEST(ADictionary, LetsAFoundValueBeChangedInPlace) {
   EXPECT_FALSE(dictionary.contains("rsrq"));
 }
 
+// Keys are compared a word at a time: a key of any length that differs from another in any one
+// character, or only in its length, is another key.
+TEST(ADictionary, FindsAKeyOnlyWhenEveryCharacterMatches) {
+  for (std::size_t length = 0; length <= 20; ++length) {
+    const std::string key(length, 'k');
+    Dictionary dictionary{{key, 1}};
+    ASSERT_NE(dictionary.find(key), nullptr) << length;
+    EXPECT_EQ(dictionary.find(key + "k"), nullptr) << length;
+    for (std::size_t at = 0; at < length; ++at) {
+      std::string other = key;
+      other[at] = 'x';
+      EXPECT_EQ(dictionary.find(other), nullptr) << length << " differing at " << at;
+    }
+  }
+}
+
+// Writing over a dictionary entry by entry gives what building it anew gives, whatever it held.
+TEST(ADictionary, WrittenOverIsTheDictionaryWrittenWhateverItHeldBefore) {
+  const Dictionary kWritten{{"sinr0", 12.5f}, {"rsrp0", -90}, {"timestamp", "2017-07-14 02:40:00"}};
+  const Dictionary kBefore[] = {
+      {},
+      kWritten,
+      {{"timestamp", "2017-07-14 02:39:59"}, {"sinr0", 3}, {"rsrp0", "text"}},
+      {{"sinr0", List{1, 2}}, {"a", 1}, {"b", 2}, {"c", 3}, {"timestamp", Dictionary{}}},
+  };
+  for (const Dictionary& before : kBefore) {
+    Dictionary dictionary = before;
+    std::size_t index = 0;
+    for (const auto& [key, value] : kWritten)
+      dictionary.writeOver(index++, key, value);
+    dictionary.truncate(index);
+    EXPECT_EQ(dictionary.description(), kWritten.description()) << before.description();
+  }
+}
+
 TEST(ADictionary, TakesTheLastOfRepeatedKeysInAnInitializerList) {
   const Dictionary dictionary{{"a", 1}, {"b", 2}, {"a", 3}};
   EXPECT_EQ(dictionary.size(), 2u);

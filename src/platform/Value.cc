@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cassert>
 #include <cmath>
+#include <cstdint>
 #include <cstring>
 #include <limits>
 #include <type_traits>
@@ -96,21 +97,9 @@ Dictionary::Dictionary(std::initializer_list<Entry> entries) {
     set(entry.first, entry.second);
 }
 
-namespace {
-
-// The keys of a record often share their length ("rsrp0", "sinr1"), so their first and last
-// characters are compared before the whole.
-bool sameKey(std::string_view key, std::string_view other) {
-  return key.size() == other.size() &&
-         (key.empty() || (key.front() == other.front() && key.back() == other.back() &&
-                          std::memcmp(key.data(), other.data(), key.size()) == 0));
-}
-
-}  // namespace
-
 const Value* Dictionary::find(std::string_view key) const {
   for (const Entry& entry : entries_) {
-    if (sameKey(entry.first, key)) return &entry.second;
+    if (detail::sameKey(entry.first, key)) return &entry.second;
   }
   return nullptr;
 }
@@ -133,11 +122,17 @@ void Dictionary::append(std::string key, Value value) {
 }
 
 bool Dictionary::erase(std::string_view key) {
-  const auto found = std::find_if(entries_.begin(), entries_.end(),
-                                  [key](const Entry& entry) { return sameKey(entry.first, key); });
+  const auto found = std::find_if(entries_.begin(), entries_.end(), [key](const Entry& entry) {
+    return detail::sameKey(entry.first, key);
+  });
   if (found == entries_.end()) return false;
   entries_.erase(found);
   return true;
+}
+
+void Dictionary::truncate(std::size_t size) {
+  if (size < entries_.size())
+    entries_.erase(entries_.begin() + static_cast<std::ptrdiff_t>(size), entries_.end());
 }
 
 void Dictionary::reserve(std::size_t capacity) {

@@ -1,8 +1,10 @@
 #pragma once
 
+#include <cassert>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <initializer_list>
 #include <optional>
 #include <string>
@@ -40,6 +42,12 @@ class Dictionary {
   void append(std::string key, Value value);
   // Removes the entry and keeps the order of the others; false when the key is absent.
   bool erase(std::string_view key);
+
+  // For rewriting a dictionary in place: writes the entry over the one at `index` (at most
+  // size(), where it appends), reusing the storage of its key and value, and truncate() then
+  // drops the entries not written over. The caller keeps the keys unique once done.
+  void writeOver(std::size_t index, std::string_view key, const Value& value);
+  void truncate(std::size_t size);
 
   std::size_t size() const;
   bool empty() const;
@@ -206,6 +214,48 @@ std::string description(const List& list);
 // Appends the text form, as description() gives it, to `out`, growing it once.
 void appendDescription(std::string& out, const Value& value);
 void appendDescription(std::string& out, const Dictionary& dictionary);
+
+namespace detail {
+template <class Word>
+inline Word wordAt(const char* at) {
+  Word word;
+  std::memcpy(&word, at, sizeof word);
+  return word;
+}
+
+// Keys are short and those of a record often share their length ("rsrp0", "sinr1"): they are
+// compared a word at a time, in words that may overlap, rather than through memcmp.
+inline bool sameKey(std::string_view key, std::string_view other) {
+  const std::size_t size = key.size();
+  if (size != other.size()) return false;
+  const char* const a = key.data();
+  const char* const b = other.data();
+  if (size >= 8) {
+    for (std::size_t at = 0; at + 8 < size; at += 8) {
+      if (wordAt<std::uint64_t>(a + at) != wordAt<std::uint64_t>(b + at)) return false;
+    }
+    return wordAt<std::uint64_t>(a + size - 8) == wordAt<std::uint64_t>(b + size - 8);
+  }
+  if (size >= 4) {
+    return wordAt<std::uint32_t>(a) == wordAt<std::uint32_t>(b) &&
+           wordAt<std::uint32_t>(a + size - 4) == wordAt<std::uint32_t>(b + size - 4);
+  }
+  return size == 0 || (a[0] == b[0] && a[size / 2] == b[size / 2] && a[size - 1] == b[size - 1]);
+}
+
+}  // namespace detail
+
+inline void Dictionary::writeOver(std::size_t index, std::string_view key, const Value& value) {
+  assert(index <= entries_.size() && "Dictionary::writeOver past the end");
+  if (index == entries_.size()) {
+    entries_.emplace_back(std::string(key), value);
+    return;
+  }
+  Entry& entry = entries_[index];
+  // Rows written over rows of the same shape mostly find their key in place already.
+  if (!detail::sameKey(entry.first, key)) entry.first.assign(key);
+  entry.second = value;
+}
 
 inline std::size_t Dictionary::size() const {
   return entries_.size();

@@ -83,13 +83,6 @@ bool holdsEscapedCharacter(std::uint64_t characters) {
   return holdsByte('"') || holdsByte('\\');
 }
 
-template <class Word>
-std::uint64_t load(const char* at) {
-  Word word;
-  std::memcpy(&word, at, sizeof word);
-  return word;
-}
-
 // Whether quoting the text takes a backslash. Keys and enum names never do, so they are tested
 // eight characters at a time, in words that may overlap, and then copied whole.
 bool needsEscapes(std::string_view text) {
@@ -97,13 +90,14 @@ bool needsEscapes(std::string_view text) {
   const std::size_t size = text.size();
   if (size >= 8) {
     for (std::size_t word = 0; word + 8 <= size; word += 8) {
-      if (holdsEscapedCharacter(load<std::uint64_t>(at + word))) return true;
+      if (holdsEscapedCharacter(detail::wordAt<std::uint64_t>(at + word))) return true;
     }
-    return holdsEscapedCharacter(load<std::uint64_t>(at + size - 8));
+    return holdsEscapedCharacter(detail::wordAt<std::uint64_t>(at + size - 8));
   }
   if (size >= 4) {
-    return holdsEscapedCharacter(load<std::uint32_t>(at) | load<std::uint32_t>(at + size - 4)
-                                                               << 32);
+    const std::uint64_t low = detail::wordAt<std::uint32_t>(at);
+    const std::uint64_t high = detail::wordAt<std::uint32_t>(at + size - 4);
+    return holdsEscapedCharacter(low | high << 32);
   }
   if (size > 0) {
     return isEscaped(at[0]) || isEscaped(at[size / 2]) || isEscaped(at[size - 1]);

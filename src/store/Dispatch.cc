@@ -1,5 +1,8 @@
 #include "store/Dispatch.h"
 
+#include <array>
+#include <span>
+#include <stdexcept>
 #include <string>
 #include <unordered_map>
 #include <utility>
@@ -12,6 +15,72 @@ namespace store {
 namespace {
 
 using platform::Dictionary;
+
+// The entries that each row of a list takes over from its parent: the parent's entries under
+// the step's parent keys, rewritten by the step's conversions of their keys once for all rows.
+// A row is its element with these in place of the element's own entries of the same keys, and
+// those the element lacks after its own; one that a conversion drops is in no row.
+class InheritedEntries {
+ public:
+  InheritedEntries(const CopyList& step, const Dictionary& parent,
+                   const TimestampFormatter& formatTimestamp) {
+    if (step.parentKeys.size() > kMost) throw std::logic_error("a row takes over too many keys");
+    for (const std::string_view key : step.parentKeys) {
+      const platform::Value* value = parent.find(key);
+      if (value == nullptr) continue;
+      Inherited& entry = entries_[count_++];
+      entry.key = key;
+      entry.value = value;
+      for (const EntryConversion& conversion : step.conversions) {
+        if (conversion.key != key || entry.value == nullptr) continue;
+        std::optional<platform::Value> converted =
+            convertValue(conversion.rule, *entry.value, formatTimestamp);
+        if (!converted) continue;
+        entry.converted = std::move(*converted);
+        entry.value = entry.converted.isNull() ? nullptr : &entry.converted;
+      }
+    }
+  }
+
+  bool holds(std::string_view key) const { return find(key) != nullptr; }
+
+  void writeRow(const Dictionary& element, Dictionary& row) const {
+    std::size_t written = 0;
+    const auto write = [&row, &written](std::string_view key, const platform::Value* value) {
+      if (value != nullptr) row.writeOver(written++, key, *value);
+    };
+    for (const auto& [key, value] : element) {
+      const Inherited* entry = find(key);
+      write(key, entry != nullptr ? entry->value : &value);
+    }
+    for (const Inherited& entry : entries()) {
+      if (!element.contains(entry.key)) write(entry.key, entry.value);
+    }
+    row.truncate(written);
+  }
+
+ private:
+  // More than the handlers' rows take over.
+  static constexpr std::size_t kMost = 4;
+
+  struct Inherited {
+    std::string_view key;
+    const platform::Value* value = nullptr;  // null when dropped
+    platform::Value converted;
+  };
+
+  std::span<const Inherited> entries() const { return {entries_.data(), count_}; }
+
+  const Inherited* find(std::string_view key) const {
+    for (const Inherited& entry : entries()) {
+      if (entry.key == key) return &entry;
+    }
+    return nullptr;
+  }
+
+  std::array<Inherited, kMost> entries_;
+  std::size_t count_ = 0;
+};
 
 // Runs the steps of one handler over the display dictionary it has just stored. Once its log
 // line holds the dictionary, a step that changes it changes a copy.
@@ -58,20 +127,16 @@ class StepRunner {
   void operator()(const CopyList& step) const {
     const platform::Value* source = display().find(step.key);
     if (source == nullptr || !hasShape(*source, ValueShape::DictionaryList)) return;
-    const Dictionary& parent = step.parent(store_, display());
+    const InheritedEntries inherited(step, step.parent(store_, display()), formatTimestamp_);
     const platform::List& elements = *source->asList();
     platform::List& rows = step.destination(store_);
     rows.resize(elements.size());
     for (std::size_t i = 0; i < elements.size(); ++i) {
       if (!rows[i].isDictionary()) rows[i] = Dictionary();
       Dictionary& row = *rows[i].asDictionary();
-      row = *elements[i].asDictionary();
-      for (const std::string_view key : step.parentKeys) {
-        if (const platform::Value* inherited = parent.find(key))
-          row.set(std::string(key), *inherited);
-      }
+      inherited.writeRow(*elements[i].asDictionary(), row);
       for (const EntryConversion& conversion : step.conversions) {
-        convertEntry(row, conversion, formatTimestamp_);
+        if (!inherited.holds(conversion.key)) convertEntry(row, conversion, formatTimestamp_);
       }
     }
   }

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <atomic>
 #include <charconv>
+#include <cstring>
+#include <iterator>
 #include <memory>
 
 #include "platform/DateFormat.h"
@@ -19,24 +21,34 @@ constexpr std::string_view kTimestampPattern = "yyyy-MM-dd HH:mm:ss zzz";
 
 std::atomic<MetricSession*> sharedSession{nullptr};
 
-// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its
-// 64 bits, at least two wide), without the general formatter: the line is
-// written for every metric.
-std::string metricIDLine(std::int64_t metricID) {
-  constexpr std::string_view kPrefix = "Metric ID in Hex = ";
-  char digits[16];
-  char* const last =
-      std::to_chars(digits, digits + sizeof digits, static_cast<std::uint64_t>(metricID), 16).ptr;
-  std::transform(digits, last, digits,
-                 [](char c) { return c >= 'a' ? static_cast<char>(c - 'a' + 'A') : c; });
-  const auto length = static_cast<std::size_t>(last - digits);
-  std::string line;
-  line.reserve(kPrefix.size() + std::max<std::size_t>(length, 2));
-  line.append(kPrefix);
-  if (length < 2) line.push_back(' ');
-  line.append(digits, length);
-  return line;
-}
+// "Metric ID in Hex = " and the ID as "%2X" writes it (upper-case digits of its 64 bits, at
+// least two wide), without the general formatter and without allocating: the line is written
+// for every metric.
+class MetricIDLine {
+ public:
+  explicit MetricIDLine(std::int64_t metricID) {
+    std::memcpy(text_, kPrefix.data(), kPrefix.size());
+    char* const digits = text_ + kPrefix.size();
+    char* last =
+        std::to_chars(digits, std::end(text_), static_cast<std::uint64_t>(metricID), 16).ptr;
+    if (last - digits < 2) {
+      digits[1] = digits[0];
+      digits[0] = ' ';
+      last = digits + 2;
+    }
+    std::transform(digits, last, digits,
+                   [](char c) { return c >= 'a' ? static_cast<char>(c - 'a' + 'A') : c; });
+    length_ = static_cast<std::size_t>(last - text_);
+  }
+
+  std::string_view text() const { return {text_, length_}; }
+
+ private:
+  static constexpr std::string_view kPrefix = "Metric ID in Hex = ";
+
+  char text_[kPrefix.size() + 16];
+  std::size_t length_;
+};
 
 }  // namespace
 
@@ -79,7 +91,7 @@ bool MetricValidator::isMetricIDValidWithMetricdict(const platform::Dictionary& 
     platform::log::plain("The metric record has no integer \"kKeyMetricID\"; nothing to do");
     return false;
   }
-  platform::log::plain(metricIDLine(*metricID_));
+  platform::log::plain(MetricIDLine(*metricID_).text());
 
   const Handler* handler = handlerFor(*metricID_);
   if (handler == nullptr) {

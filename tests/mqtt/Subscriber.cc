@@ -40,10 +40,6 @@ std::size_t Subscriber::connections() const {
   return connections_;
 }
 
-}  // namespace mqtttest
-
-namespace mqtttest {
-
 std::size_t Subscriber::subscriptions() const {
   const std::lock_guard lock(mutex_);
   return subscriptions_;

@@ -98,25 +98,6 @@ class ModemManagerSourceTest : public ::testing::Test {
   std::unique_ptr<tarn::mm::ModemManagerSource> source;  // stops first
 };
 
-TEST_F(ModemManagerSourceTest, FollowsTheFirstModemThroughAHandover) {
-  fake->addModem(0, lteModem(kImei));
-  fake->setCells(0, {lteCell(true, 0x1A0, 1300, -97, -11), lteCell(false, 17, 1300, -105, -14.5)});
-  startSource();
-  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }))
-      << ::testing::PrintToString(seen.lines());
-  EXPECT_EQ(fake->setupRate(0), 1u);
-  EXPECT_THAT(seen.lines(), Contains("following modem 0 (/org/freedesktop/ModemManager1/Modem/0, "
-                                     "Fake EG25, 490154203237518)"));
-  const auto neighbours =
-      seen.last<messages::KCellularLteNbrEutraCellMeas>(ids::KCellularLteNbrEutraCellMeas);
-  ASSERT_TRUE(neighbours);
-  ASSERT_EQ(neighbours->measNbrEutrasCount(), 1u);
-  EXPECT_EQ(neighbours->measNbrEutraAtIndex(0)->nbrRsrp(), -105 + 140);
-
-  fake->setCells(0, {lteCell(true, 17, 1300, -90, -9), lteCell(false, 0x1A0, 1300, -108, -15)});
-  EXPECT_TRUE(eventually([&] { return servingPci() == 17; }));
-}
-
 TEST_F(ModemManagerSourceTest, NamesTheRefusedPolkitActionOnceAndGoesOnWithTheSignal) {
   fake->refuseDeviceControl(true);
   addServingModem(*fake, 0, kImei, 0x1A0);

@@ -40,10 +40,10 @@ using ::testing::HasSubstr;
 using ::testing::StartsWith;
 namespace status = tarn::status;
 
-constexpr std::uint32_t kRrcState = 0x3C4E04;
-constexpr std::uint32_t kCaStatus = 0x3CD313;
+using bustest::kCaStatus;
+using bustest::kRrcState;
+using bustest::kSimFiles;
 constexpr std::uint32_t kNeighbours = 0x3CD30F;
-constexpr std::uint32_t kSimFiles = 0x3C0013;
 
 Object metricRecord(std::uint32_t metricId, platform::Bytes payload, std::int64_t profileId) {
   return Object::dictionary({entry(tarn::kKeyMetricID, Object::integer(metricId)),
@@ -164,6 +164,8 @@ class AServiceOnABus : public ::testing::Test {
   tarn::dbus::Service service{core, tarn::dbus::connectToBus(bus.address())};
 };
 
+// A record of each shape that a command takes, and an answer of each kind, over the bus; the
+// service's own tests hold every fault it names.
 TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceGave) {
   RecordingSession session(transport);
   const struct {
@@ -185,23 +187,11 @@ TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceG
       {tarn::kCommandClearConfiguration,
        Object::dictionary({entry(tarn::kKeyAppID, Object::text("2"))}),
        {status::kInvalidArgument, "argument kKeyAppID is not an integer"}},
-      {tarn::kCommandClearConfiguration,
-       Object::dictionary({entry(tarn::kKeyAppID, Object::integer(7))}),
-       {status::kUnknownAppId, "unknown app ID 7"}},
       {tarn::kCommandAddConfiguration,
        withAppId({entry(tarn::kKeyPayload, bytesOf("0x1\n0xZZ\n"))}),
        {status::kMalformedConfiguration,
         "malformed configuration: line 2: '0xZZ' is not a metric ID; write metric IDs in hex, "
         "like 0x3C4E04"}},
-      {tarn::kCommandAddConfiguration,
-       withAppId({entry(tarn::kKeyPayload, bytesOf("0x1")),
-                  entry(tarn::kKeyPayloadType, Object::integer(1))}),
-       {status::kInvalidArgument, "unsupported payload type 1"}},
-      {tarn::kCommandQueryMetric,
-       withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x3C0013))}),
-       {status::kInvalidArgument,
-        "trigger ID 0x3C0013 asks for no metric; on-demand triggers run from 0x7F0000 to "
-        "0x7FFFFF"}},
       {tarn::kCommandQueryMetric,
        withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F4E04))}),
        {status::kNoSuchMetric, "the baseband has no metric 0x3C4E04 to report"}},
@@ -231,9 +221,7 @@ TEST_F(AServiceOnABus, DeliversTheSubscribedMetricsAndQueryAnswersInTheirOrder) 
     expected.push_back(metricEvent(metricId, std::move(payload), 7));
   }
   source->flush();
-  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric,
-                            withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
-                                       entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
+  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery(9999)),
             CommandResult{});
   expected.push_back({std::string(tarn::kEventTrigger),
                       withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
@@ -259,10 +247,8 @@ TEST_F(AServiceOnABus, GivesEachClientOnlyWhatItsOwnConfigurationSubscribes) {
   source->flush();
   // Answers come after everything delivered before them, so the unconfigured session's first
   // events show that no metric reached it.
-  ASSERT_EQ(
-      unconfigured.perform(tarn::kCommandQueryMetric,
-                           withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
-      CommandResult{});
+  ASSERT_EQ(unconfigured.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery()),
+            CommandResult{});
 
   EXPECT_EQ(rrc.waitFor(2),
             (std::vector{metricEvent(kRrcState, {1}, 0), metricEvent(kRrcState, {3}, 0)}));

@@ -49,13 +49,6 @@ const std::vector<std::string> kSimulator = {"--source", "sim", "--seed", "3", "
 // Measurements that the simulated phone reports several times a second on each radio.
 constexpr std::string_view kMeasurements = "0x3CD301\n0x3C4F6A\n0x3CD302\n0x3CD102\n0x3CD002\n";
 const std::set<std::int64_t> kMeasurementIds = {0x3CD301, 0x3C4F6A, 0x3CD302, 0x3CD102, 0x3CD002};
-constexpr std::int64_t kSimFiles = 0x3C0013;
-
-Object simFilesQuery(std::int64_t triggerRef) {
-  return withAppId({entry(tarn::kKeyTriggerRef, Object::integer(triggerRef)),
-                    entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))});
-}
-
 std::vector<std::string> linesOf(const std::string& text) {
   std::vector<std::string> lines;
   std::istringstream stream(text);
@@ -78,7 +71,7 @@ TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationW
 
   EXPECT_EQ(first->stop(SIGTERM, 10s), 0) << first->standardError();
   ASSERT_TRUE(bus.waitForName(kBusName, false));
-  const CommandResult gone = session.perform(tarn::kCommandQueryMetric, simFilesQuery(1));
+  const CommandResult gone = session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery(1));
   EXPECT_EQ(gone.status, tarn::status::kServiceUnavailable);
   EXPECT_THAT(gone.message, StartsWith("the baseband manager service has gone away"));
   // Pushed while the service is away, so the returning service must receive it from the client.
@@ -90,7 +83,8 @@ TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationW
 
   auto second = startTarnd(bus.address(), kSimulator, folder / "second");
   ASSERT_TRUE(bus.waitForName(kBusName, true)) << second->standardError();
-  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric, simFilesQuery(4242)), CommandResult{});
+  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery(4242)),
+            CommandResult{});
   // The metric events after the query's trigger event, which only the second service sent.
   const auto metricsSinceTheQuery = [&session] {
     const std::vector<ReceivedEvent> events = session.received();
@@ -108,7 +102,7 @@ TEST(ASessionWithTarnd, OutlivesTheServiceAndRecoversWithTheLatestConfigurationW
 
   for (const Object& metric : metricsSinceTheQuery()) {
     const std::int64_t metricId = integerAt(metric, tarn::kKeyMetricID);
-    if (metricId == kSimFiles) continue;  // the query's answer
+    if (metricId == bustest::kSimFiles) continue;  // the query's answer
     EXPECT_TRUE(kMeasurementIds.contains(metricId)) << metricId;
     EXPECT_EQ(integerAt(metric, tarn::kKeyProfileID), 9);
   }

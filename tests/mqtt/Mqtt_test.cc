@@ -196,15 +196,13 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   EXPECT_THAT(log.systemLines(), ::testing::Contains(HasSubstr("certificate verify failed")));
 }
 
-constexpr std::uint32_t kRrcState = 0x3C4E04;
-constexpr std::uint32_t kCaStatus = 0x3CD313;
-constexpr std::uint32_t kSimFiles = 0x3C0013;
+using bustest::kCaStatus;
+using bustest::kRrcState;
+using bustest::kSimFiles;
 
 // The query a viewer sends for the SIM files.
 tarn::CommandResult querySimFiles(RecordingSession& session) {
-  return session.perform(tarn::kCommandQueryMetric,
-                         bustest::withAppId({bustest::entry(
-                             tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+  return session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery());
 }
 
 tarn::service::Metric metric(std::uint32_t metricId, std::uint8_t mark) {

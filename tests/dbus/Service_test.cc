@@ -265,33 +265,47 @@ TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKe
   const std::string session = owner.openSession("vexmora");
   EXPECT_THAT(session, StartsWith(tarn::dbus::kSessionPathPrefix));
   const std::string manager(tarn::dbus::kManagerPath);
-  const auto& sessionInterface = tarn::dbus::kSessionInterface;
-
-  EXPECT_EQ(errorOf([&] {
-              owner.call(manager, tarn::dbus::kManagerInterface, tarn::dbus::kOpenSession,
-                         [](sdbus::Message& m) { m << std::int32_t{2}; });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
-                         [](sdbus::Message& m) { m << std::string("ClearConfiguration"); });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
-                         [](sdbus::Message& m) {
-                           m << std::string("ClearConfiguration")
-                             << std::map<std::string, std::string>{{"kKeyAppID", "2"}};
-                         });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] { owner.call(manager, tarn::dbus::kManagerInterface, "Reboot"); }),
-            "org.freedesktop.DBus.Error.UnknownMethod");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(std::string(tarn::dbus::kSessionPathPrefix) + "999999", sessionInterface,
-                         tarn::dbus::kClose);
-            }),
-            "org.freedesktop.DBus.Error.UnknownObject");
+  namespace dbus = tarn::dbus;
+  const auto clear = [](sdbus::Message& m) { m << std::string("ClearConfiguration"); };
+  const struct {
+    RawClient& client;
+    std::string path;
+    std::string_view interface, method;
+    RawClient::Append append;
+    std::string error;
+  } calls[] = {
+      {owner, manager, dbus::kManagerInterface, dbus::kOpenSession,
+       [](sdbus::Message& m) { m << std::int32_t{2}; }, "InvalidArgs"},
+      {owner, session, dbus::kSessionInterface, dbus::kPerformCommand, clear, "InvalidArgs"},
+      {owner, session, dbus::kSessionInterface, dbus::kPerformCommand,
+       [&](sdbus::Message& m) {
+         clear(m);
+         m << std::map<std::string, std::string>{{"kKeyAppID", "2"}};
+       },
+       "InvalidArgs"},
+      {owner, manager, dbus::kManagerInterface, "Reboot", {}, "UnknownMethod"},
+      {owner,
+       std::string(dbus::kSessionPathPrefix) + "999999",
+       dbus::kSessionInterface,
+       dbus::kClose,
+       {},
+       "UnknownObject"},
+      {intruder, session, dbus::kSessionInterface, dbus::kPerformCommand,
+       [&](sdbus::Message& m) {
+         clear(m);
+         dbus::appendRecord(m, withAppId({}));
+       },
+       "AccessDenied"},
+      {intruder, session, dbus::kSessionInterface, dbus::kSetEventsOn,
+       [](sdbus::Message& m) { m << true; }, "AccessDenied"},
+      {intruder, session, dbus::kSessionInterface, dbus::kClose, {}, "AccessDenied"},
+  };
+  for (const auto& call : calls) {
+    EXPECT_EQ(
+        errorOf([&] { call.client.call(call.path, call.interface, call.method, call.append); }),
+        "org.freedesktop.DBus.Error." + call.error)
+        << call.method;
+  }
 
   const CommandResult withABoolean =
       owner.perform(session, tarn::kCommandClearConfiguration, [](sdbus::Message& m) {
@@ -305,14 +319,6 @@ TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKe
                                 {"kKeyAppID", sdbus::Variant(std::uint32_t{2})}};
                           }),
             CommandResult{});
-
-  EXPECT_EQ(
-      errorOf([&] { intruder.perform(session, tarn::kCommandClearConfiguration, withAppId({})); }),
-      "org.freedesktop.DBus.Error.AccessDenied");
-  EXPECT_EQ(errorOf([&] { intruder.setEventsOn(session, true); }),
-            "org.freedesktop.DBus.Error.AccessDenied");
-  EXPECT_EQ(errorOf([&] { intruder.call(session, sessionInterface, tarn::dbus::kClose); }),
-            "org.freedesktop.DBus.Error.AccessDenied");
 
   EXPECT_EQ(owner.perform(session, tarn::kCommandAddConfiguration,
                           withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))})),

@@ -45,13 +45,11 @@ TEST(AViewerOnABus, ReachesTarndOnceTheBusAppearsAndAgainAfterTheBusIsRestarted)
   bustest::TemporaryFolder folder;
   const std::filesystem::path socket = folder / "bus";
   const int port = bustest::freePort();
-  bustest::ChildProcess norvo({
-      .arguments = {NORVO_VIEWER, "--service", "dbus:unix:path=" + socket.string(), "--listen",
-                    "127.0.0.1:" + std::to_string(port), "--log", "-"},
-      .standardOutput = folder / "norvo.out",
-      .standardError = folder / "norvo.err",
-      .descriptor3 = std::nullopt,
-  });
+  bustest::ChildProcess norvo(
+      {.arguments = {NORVO_VIEWER, "--service", "dbus:unix:path=" + socket.string(), "--listen",
+                     "127.0.0.1:" + std::to_string(port), "--log", "-"},
+       .standardOutput = folder / "norvo.out",
+       .standardError = folder / "norvo.err"});
   std::optional<ServiceStatus> status;
   ASSERT_TRUE(eventually([&] { return (status = serviceStatus(port)).has_value(); }))
       << norvo.standardError();

@@ -39,8 +39,7 @@ std::vector<std::string> split(const std::string& text, char separator) {
 std::string run(const bustest::TemporaryFolder& folder, std::vector<std::string> arguments) {
   bustest::ChildProcess program({.arguments = std::move(arguments),
                                  .standardOutput = folder / "out.txt",
-                                 .standardError = folder / "errors.txt",
-                                 .descriptor3 = std::nullopt});
+                                 .standardError = folder / "errors.txt"});
   const std::optional<int> status = program.wait(120s);
   EXPECT_EQ(status, 0) << program.standardError();
   return program.standardOutput();

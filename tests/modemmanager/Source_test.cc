@@ -28,40 +28,34 @@ namespace ids = messages::metric;
 // What the source delivers and says, as it comes.
 class Seen {
  public:
-  tarn::mm::StatusSink statusSink() {
-    return [this](const std::string& line) {
-      std::lock_guard lock(mutex_);
-      lines_.push_back(line);
-    };
+  void say(const std::string& line) {
+    const std::lock_guard lock(mutex_);
+    lines_.push_back(line);
   }
-  std::function<void(tarn::service::Metric)> deliverSink() {
-    return [this](tarn::service::Metric metric) {
-      std::lock_guard lock(mutex_);
-      metrics_.push_back(std::move(metric));
-    };
+  void deliver(tarn::service::Metric metric) {
+    const std::lock_guard lock(mutex_);
+    metrics_.push_back(std::move(metric));
   }
   std::vector<std::string> lines() const {
-    std::lock_guard lock(mutex_);
+    const std::lock_guard lock(mutex_);
     return lines_;
   }
   std::size_t count(std::string_view fragment) const {
-    const std::vector<std::string> all = lines();
-    return static_cast<std::size_t>(std::count_if(all.begin(), all.end(), [&](auto& line) {
-      return line.find(fragment) != std::string::npos;
-    }));
+    return static_cast<std::size_t>(std::ranges::count_if(
+        lines(), [&](const std::string& line) { return line.find(fragment) != line.npos; }));
   }
   bool said(std::string_view fragment) const { return count(fragment) > 0; }
   // The last metric of `metricId` decoded with `Record`, if one came.
   template <class Record>
   std::shared_ptr<Record> last(std::uint32_t metricId) const {
-    std::lock_guard lock(mutex_);
+    const std::lock_guard lock(mutex_);
     for (const auto& metric : std::ranges::reverse_view(metrics_)) {
       if (metric.metricId == metricId) return Record::initWithData(&metric.payload);
     }
     return nullptr;
   }
   void clear() {
-    std::lock_guard lock(mutex_);
+    const std::lock_guard lock(mutex_);
     metrics_.clear();
     lines_.clear();
   }
@@ -78,8 +72,8 @@ class ModemManagerSourceTest : public ::testing::Test {
     source = std::make_unique<tarn::mm::ModemManagerSource>(
         tarn::mm::ModemManagerOptions{
             .bus = bus.address(), .modem = std::move(modem), .refresh = 100ms},
-        seen.statusSink());
-    source->start(seen.deliverSink());
+        [this](const std::string& line) { seen.say(line); });
+    source->start([this](tarn::service::Metric metric) { seen.deliver(std::move(metric)); });
   }
 
   std::shared_ptr<messages::KCellularLteRsrpRsrqSinr> levels() const {
@@ -127,7 +121,6 @@ TEST_F(ModemManagerSourceTest, DropsAValueOfTheWrongTypeWithOneLineAndKeepsTheRe
   serving["earfcn"] = sdbus::Variant(std::string("1300"));
   fake->setCells(0, {serving});
   startSource();
-  ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0; }));
   ASSERT_TRUE(eventually([&] { return servingPci() == 0x1A0 && seen.count("earfcn") == 1; }));
   EXPECT_FALSE(seen.last<messages::KCellularLteScellInfo>(ids::KCellularLteScellInfo)->hasDlFreq());
   EXPECT_THAT(seen.lines(), Contains("cell 0 \"earfcn\": wanted u, got s; dropped"));

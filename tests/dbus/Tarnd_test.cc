@@ -1,23 +1,34 @@
+// tarnd, and Norvo, as programs of their own on buses of the tests' own: sessions that outlive
+// them, replays of broken and recorded logs, and a viewer whose bus goes away and comes back.
 #include "Tarnd.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <boost/json/parse.hpp>
 #include <csignal>
 #include <fstream>
 #include <set>
 #include <sstream>
 #include <thread>
 
+#include "ChildProcess.h"
 #include "Eventually.h"
 #include "Files.h"
+#include "LoopbackHttp.h"
 #include "Printing.h"
 #include "PrivateBus.h"
 #include "RecordingSession.h"
 #include "Records.h"
 #include "TemporaryFolder.h"
+#include "app/IntakeCommand.h"
+#include "client/TarnWrapper.h"
+#include "platform/Json.h"
 #include "platform/Log.h"
+#include "platform/MainQueue.h"
+#include "store/MetricValidator.h"
+#include "store/StoreDump.h"
 #include "tarn/Names.h"
 #include "tarn/client/LinkStatus.h"
 #include "tarn/dbus/BusTransport.h"
@@ -242,6 +253,166 @@ TEST(ATarnd, ExitsWithAMessageWhenItsNameIsTakenAndWhenItsBusGoesAway) {
   bus.reset();
   EXPECT_EQ(serving->wait(10s), 1);
   EXPECT_THAT(serving->standardError(), HasSubstr("tarnd: lost the connection to the bus at"));
+}
+
+using bustest::contentsOf;
+
+// tarnd starts its source before it takes its bus name, so no client can have subscribed before a
+// replay begins. The replay loops instead, and this metric begins each pass, so that the client
+// can tell a whole pass from the tail of one it joined late. Nothing on the phone reports it.
+constexpr std::int64_t kPassMarker = 0x3CFFFF;
+constexpr std::int64_t kPauseBeforeEachPassMs = 300;
+
+// The recording as a replay of its records alone, without pauses, each pass led by the marker
+// after a pause. Answers how many records it holds.
+std::size_t writePasses(const std::filesystem::path& recording, const std::filesystem::path& out) {
+  std::ifstream input(recording);
+  std::ofstream output(out);
+  tarn::log::MetricLogReader reader(input);
+  tarn::log::MetricLogWriter writer(output);
+  writer.write({{"kKeyMetricID", kPassMarker}, {"kKeyPayload", platform::Bytes{0}}},
+               kPauseBeforeEachPassMs);
+  std::size_t records = 0;
+  while (const auto line = reader.next()) {
+    if (line->parsed.entry && writer.write(line->parsed.entry->record)) ++records;
+  }
+  return records;
+}
+
+// Hands on to the store the metrics of the first whole pass that arrives.
+class OnePass final : public TarnWrapperDelegate {
+ public:
+  explicit OnePass(TarnWrapperDelegate& store) : store_(store) {}
+
+  void metricsDidUpdate(const platform::Dictionary& metric) override {
+    const platform::Value* metricId = metric.find("kKeyMetricID");
+    if (metricId != nullptr && metricId->asInteger() == kPassMarker) {
+      ++markers_;
+    } else if (markers_ == 1) {
+      store_.metricsDidUpdate(metric);
+      ++handedOn_;
+    }
+  }
+  void eventsDidUpdate(const platform::Dictionary&) override {}
+
+  bool complete() const { return markers_ >= 2; }
+  std::size_t handedOn() const { return handedOn_; }
+
+ private:
+  TarnWrapperDelegate& store_;
+  int markers_ = 0;
+  std::size_t handedOn_ = 0;
+};
+
+TEST(ARecordingReplayedByTarnd, FillsAClientsStoreAsTheIntakeOfTheRecordingDoes) {
+  platform::log::Capture log;
+  bustest::TemporaryFolder folder;
+  bustest::PrivateBus bus;
+
+  const std::filesystem::path recording = folder / "recording.jsonl";
+  auto recorder = startTarnd(
+      bus.address(), {"--source", "sim", "--seed", "5", "--speed", "60", "--record", recording},
+      folder / "recorder");
+  ASSERT_TRUE(bus.waitForName(kBusName, true)) << recorder->standardError();
+  ASSERT_TRUE(eventually([&] { return lineCount(recording) >= 400; }));
+  ASSERT_EQ(recorder->stop(SIGTERM, 10s), 0) << recorder->standardError();
+  ASSERT_TRUE(bus.waitForName(kBusName, false));
+
+  const std::filesystem::path passes = folder / "passes.jsonl";
+  const std::size_t records = writePasses(recording, passes);
+  const std::filesystem::path configuration = folder / "with-marker.deviceconfig";
+  std::ofstream(configuration) << contentsOf(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig")
+                               << "\n0x" << std::hex << kPassMarker << "\n";
+  auto replay = startTarnd(bus.address(), {"--source", "replay:" + passes.string(), "--loop"},
+                           folder / "replay");
+  ASSERT_TRUE(bus.waitForName(kBusName, true)) << replay->standardError();
+
+  store::MetricValidator received(nullptr);
+  const auto pass = std::make_shared<OnePass>(received);
+  tarn::dbus::BusTransport transport(bus.address());
+  {
+    TarnWrapper session(transport);
+    session.setDelegate(pass);
+    ASSERT_TRUE(session.addVelaConfigForAppId("vexmora", configuration.string()));
+    session.listen();
+    platform::runMainQueueUntil([&] { return pass->complete(); }, 20s);
+  }
+  EXPECT_EQ(replay->stop(SIGTERM, 10s), 0) << replay->standardError();
+  ASSERT_TRUE(pass->complete());
+  EXPECT_EQ(pass->handedOn(), records);
+
+  store::MetricValidator intake(nullptr);
+  std::ifstream recorded(recording);
+  std::ostringstream errors;
+  ASSERT_TRUE(app::deliverMetricLog(recorded, "recording.jsonl", intake, errors));
+  EXPECT_EQ(errors.str(), "");
+  const platform::Dictionary dump = store::dumpStore(received);
+  ASSERT_FALSE(dump.find("metricID")->isNull());
+  ASSERT_FALSE(dump.find("myLTERRCStateDict")->isNull());
+  EXPECT_EQ(platform::toJson(dump), platform::toJson(store::dumpStore(intake)));
+}
+
+struct ServiceStatus {
+  bool connected = false;
+  std::string text;
+};
+
+// The service's part of /api/status; empty while the page does not answer.
+std::optional<ServiceStatus> serviceStatus(int port) {
+  const std::optional<std::string> body = bustest::get(port, "/api/status");
+  if (!body) return std::nullopt;
+  const boost::json::value status = boost::json::parse(*body);
+  const boost::json::object& service = status.at("service").as_object();
+  return ServiceStatus{service.at("connected").as_bool(),
+                       std::string(service.at("status").as_string())};
+}
+
+// Metrics the viewer took in so far, as its log lines count them.
+std::size_t metricsLogged(const bustest::ChildProcess& norvo) {
+  const std::string log = norvo.standardOutput();
+  std::size_t count = 0;
+  for (std::size_t at = 0; (at = log.find("Received Valid Metric", at)) != std::string::npos; ++at)
+    ++count;
+  return count;
+}
+
+// Norvo as a user runs it against tarnd on a bus that is not there yet, and that goes away and
+// comes back: the viewer reaches it each time, says so in /api/status, and shows its metrics.
+TEST(AViewerOnABus, ReachesTarndOnceTheBusAppearsAndAgainAfterTheBusIsRestarted) {
+  bustest::TemporaryFolder folder;
+  const std::filesystem::path socket = folder / "bus";
+  const int port = bustest::freePort();
+  bustest::ChildProcess norvo(
+      {.arguments = {NORVO_VIEWER, "--service", "dbus:unix:path=" + socket.string(), "--listen",
+                     "127.0.0.1:" + std::to_string(port), "--log", "-"},
+       .standardOutput = folder / "norvo.out",
+       .standardError = folder / "norvo.err"});
+  std::optional<ServiceStatus> status;
+  ASSERT_TRUE(eventually([&] { return (status = serviceStatus(port)).has_value(); }))
+      << norvo.standardError();
+  EXPECT_FALSE(status->connected);
+  EXPECT_NE(status->text.find("cannot reach the bus"), std::string::npos) << status->text;
+
+  for (const std::string round : {"first", "second"}) {
+    auto bus = std::make_unique<bustest::PrivateBus>(socket);
+    const std::size_t before = metricsLogged(norvo);
+    auto tarnd =
+        bustest::startTarnd(bus->address(), {"--source", "sim", "--speed", "20"}, folder / round);
+    EXPECT_TRUE(eventually([&] { return serviceStatus(port).value_or(ServiceStatus{}).connected; }))
+        << round << ": " << norvo.standardError();
+    EXPECT_TRUE(eventually([&] { return metricsLogged(norvo) >= before + 5; }))
+        << round << ": " << tarnd->standardError();
+
+    bus.reset();
+    EXPECT_EQ(tarnd->wait(10s), 1) << "tarnd leaves with its bus";
+    EXPECT_TRUE(eventually([&] {
+      return !serviceStatus(port).value_or(ServiceStatus{true, {}}).connected;
+    })) << round;
+  }
+  EXPECT_EQ(norvo.stop(SIGINT, 10s), 0) << norvo.standardError();
+  const std::string errors = norvo.standardError();
+  EXPECT_EQ(errors.find("cannot reach the bus"), errors.rfind("cannot reach the bus"))
+      << "said once: " << errors;
 }
 
 }  // namespace

@@ -88,7 +88,6 @@ TEST(APublisher, DeliversEachLineByteForByteInOrderAtEitherQualityOfService) {
   for (const int qos : {0, 1}) {
     SCOPED_TRACE(qos);
     Subscriber subscriber(watching(broker, "fleet/#"));
-    ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
     Publisher publisher(publisherOptions(broker, qos, 1000));
     ASSERT_TRUE(eventually([&] { return publisher.counts().linked; }));
 
@@ -119,7 +118,6 @@ TEST(APublisher, HoldsMetricsWhileTheBrokerIsAwayAndDropsTheOldestPastItsBound) 
   options.clientId = "watcher";
   options.cleanSession = false;
   Subscriber subscriber(std::move(options));
-  ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
   platform::log::Capture log;
   constexpr std::size_t kBound = 50;
   Publisher publisher(publisherOptions(broker, 1, kBound));
@@ -171,7 +169,6 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   LinkOptions watcher = watching(broker, "fleet/#");
   watcher.caFile = certificates.authority.string();
   Subscriber subscriber(std::move(watcher));
-  ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
 
   tarn::mqtt::PublisherOptions options = publisherOptions(broker, 1, 10);
   options.caFile = certificates.authority.string();
@@ -310,32 +307,24 @@ std::unique_ptr<bustest::ChildProcess> startPublishingTarnd(const std::string& b
   return bustest::startTarnd(bus, std::move(options), stem);
 }
 
-std::string statusOf(const std::string& message) {
-  return std::string(boost::json::parse(message).at("status").as_string());
-}
-
 TEST(APublishingTarnd, PublishesWhatItRecordsAndLeavesALastWillWhenKilled) {
   TemporaryFolder folder;
   Broker broker(folder.path(), {});
   const LinkOptions options = watching(broker, "fleet/#");
   Subscriber subscriber(options);
-  ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
 
   auto tarnd =
       startPublishingTarnd("none", broker.address("fleet"),
                            {"--record", (folder / "drive.jsonl").string()}, folder / "tarnd");
   ASSERT_TRUE(eventually([&] { return subscriber.payloadsOn(kMetrics).size() >= 20; }))
       << tarnd->standardOutput() << tarnd->standardError();
-  ASSERT_FALSE(subscriber.payloadsOn(kStatus).empty());
-  EXPECT_EQ(statusOf(subscriber.payloadsOn(kStatus).front()), "online");
+  EXPECT_EQ(lastStatus(subscriber)["status"], "online");
 
   tarnd->stop(SIGKILL, 5s);
-  ASSERT_TRUE(
-      eventually([&] { return statusOf(subscriber.payloadsOn(kStatus).back()) == "offline"; }));
+  ASSERT_TRUE(eventually([&] { return lastStatus(subscriber)["status"] == "offline"; }));
   // Retained, for whoever looks later.
   Subscriber later(options);
-  ASSERT_TRUE(eventually([&] { return !later.payloadsOn(kStatus).empty(); }));
-  EXPECT_EQ(statusOf(later.payloadsOn(kStatus).back()), "offline");
+  EXPECT_TRUE(eventually([&] { return lastStatus(later)["status"] == "offline"; }));
 
   // Each message is the recorded line with the device and the wall-clock time added.
   std::ifstream recorded(folder / "drive.jsonl");

@@ -23,9 +23,9 @@ const suite = norvoForTheseTests((folder) => {
   return ['--replay', drive, '--speed', 'max', '--alerts', alerts];
 }, { port: true });
 
-async function replayState(page) {
-  return page.evaluate(async () => (await fetch('/api/replay')).json());
-}
+// The answer of GET `address` on the page's Norvo.
+const api = (page, address) => page.evaluate(async (url) => (await fetch(url)).json(), address);
+const replayState = (page) => api(page, '/api/replay');
 
 testOnPage(suite, 'lists what happened, failures first to the eye, and shows the metric behind one', async (page) => {
   await page.goto(suite.address + '/');
@@ -66,14 +66,15 @@ testOnPage(suite, 'puts a player bar beside the tables that plays, pauses and se
   const ended = await replayState(page);
   assert.equal(ended.playing, false);
   assert.equal(ended.position_ms, ended.duration_ms);
-  const eventsAtEnd = await page.evaluate(async () => (await (await fetch('/api/events?limit=5000')).json()).events.length);
+  const eventCount = async () => (await api(page, '/api/events?limit=5000')).events.length;
+  const eventsAtEnd = await eventCount();
 
   const middle = Math.round(ended.duration_ms / 200) * 100;
   await page.locator('.player input.position').fill(String(middle));
   await page.waitForFunction((wanted) => document.querySelector('.player').dataset.position === String(wanted), middle);
   const seeked = await replayState(page);
   assert.equal(seeked.position_ms, middle);
-  const eventsAtMiddle = await page.evaluate(async () => (await (await fetch('/api/events?limit=5000')).json()).events.length);
+  const eventsAtMiddle = await eventCount();
   assert.ok(eventsAtMiddle < eventsAtEnd, `${eventsAtMiddle} events at the middle, ${eventsAtEnd} at the end`);
 
   await page.locator('.player select.speed').selectOption('1');
@@ -106,6 +107,6 @@ testOnPage(suite, 'shows active alerts as a banner above the tables, and their e
   assert.ok(bannerBottom <= tableTop + 1, 'the banner covers the table');
   await screenshot(page, 'lte-with-alert-banner');
 
-  const alerts = await page.evaluate(async () => (await (await fetch('/api/events?kind=alert')).json()).events);
+  const alerts = (await api(page, '/api/events?kind=alert')).events;
   assert.ok(alerts.some((event) => event.severity === 'warning' && event.text.startsWith('On LTE')));
 });

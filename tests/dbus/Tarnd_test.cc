@@ -288,7 +288,7 @@ TEST(ARecordingReplayedByTarnd, FillsAClientsStoreAsTheIntakeOfTheRecordingDoes)
 
   const std::filesystem::path recording = folder / "recording.jsonl";
   auto recorder = startTarnd(
-      bus.address(), {"--source", "sim", "--seed", "5", "--speed", "60", "--record", recording},
+      bus.address(), {"--source", "sim", "--seed", "5", "--speed", "600", "--record", recording},
       folder / "recorder");
   ASSERT_TRUE(bus.waitForName(kBusName, true)) << recorder->standardError();
   ASSERT_TRUE(eventually([&] { return lineCount(recording) >= 400; }));

@@ -181,22 +181,18 @@ TEST(ASessionOverABus, ReachesTheBusOnceItAppearsAndAgainEachTimeItComesBack) {
 TEST(ATarnd, ReplaysALogReportingEachBrokenLineWithItsNumber) {
   TemporaryFolder folder;
   PrivateBus bus;
-  const std::string rrcState =
-      R"({"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","kKeyProfileID":0,"kKeyAppID":2,"t_ms":0})";
-  const std::string caStatus =
-      R"({"kKeyMetricID":3986195,"kKeyPayload":"CPr79bWAMhITCAAQAhitAjACWJ+kAWCtEnCrZg==","t_ms":250})";
   const std::string log = (folder / "broken.jsonl").string();
-  std::ofstream(log) << rrcState << "\n"
-                     << "not json\n"
-                     << "\n"
-                     << "[1,2]\n"
-                     << R"({"kKeyMetricID":3952132,"kKeyPayload":"!!!"})"
-                     << "\n"
-                     << R"({"kKeyPayload":"CID69bWAMhAD"})"
-                     << "\n"
-                     << R"({"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","t_ms":-5})"
-                     << "\n"
-                     << caStatus << "\n";
+  // An RRC state and a CA status around broken lines, and an empty one that is skipped quietly.
+  std::ofstream(log)
+      << R"({"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","kKeyProfileID":0,"kKeyAppID":2,"t_ms":0}
+not json
+
+[1,2]
+{"kKeyMetricID":3952132,"kKeyPayload":"!!!"}
+{"kKeyPayload":"CID69bWAMhAD"}
+{"kKeyMetricID":3952132,"kKeyPayload":"CID69bWAMhAD","t_ms":-5}
+{"kKeyMetricID":3986195,"kKeyPayload":"CPr79bWAMhITCAAQAhitAjACWJ+kAWCtEnCrZg==","t_ms":250}
+)";
   const std::filesystem::path recording = folder / "replayed.jsonl";
 
   auto tarnd = startTarnd(

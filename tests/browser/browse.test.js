@@ -2,17 +2,14 @@
 
 const assert = require('node:assert/strict');
 const { test } = require('node:test');
-const { norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
+const { norvoForTheseTests, openPage, screenshot, testOnPage } = require('./norvo.js');
 
 const suite = norvoForTheseTests();
 
 const rowTexts = (page) => page.locator('main .row .text').allTextContents();
 const title = (page) => page.locator('.bar h1').textContent();
 
-const newPage = () => openPage(suite.browser);
-
-test('browses Device Info, LTE, UMTS and GSM from the launch screen', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'browses Device Info, LTE, UMTS and GSM from the launch screen', async (page) => {
   await page.goto(suite.address + '/');
   assert.equal(await title(page), 'Norvo');
   assert.deepEqual(await rowTexts(page), ['Device Info', 'LTE', 'UMTS', 'GSM']);
@@ -37,12 +34,9 @@ test('browses Device Info, LTE, UMTS and GSM from the launch screen', async () =
   await page.goto(suite.address + '/Device%20Info/IMSI');
   assert.deepEqual(await page.locator('main .row').first().innerText(), 'Come back later\nCome back later');
   await screenshot(page, 'device-info-imsi');
-  assert.deepEqual(problems, []);
-  await page.close();
 });
 
-test('opens LTE and CA Status, refreshes it in place and goes back', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'opens LTE and CA Status, refreshes it in place and goes back', async (page) => {
   await page.goto(suite.address + '/');
   await page.getByRole('link', { name: 'LTE', exact: true }).click();
   await page.getByRole('link', { name: 'CA Status', exact: true }).click();
@@ -75,12 +69,9 @@ test('opens LTE and CA Status, refreshes it in place and goes back', async () =>
   await page.locator('.bar .back').click();
   await page.waitForURL(suite.address + '/LTE');
   assert.equal(await title(page), 'LTE');
-  assert.deepEqual(problems, []);
-  await page.close();
 });
 
-test('follows the dark mode of the system and fits a desktop window', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'follows the dark mode of the system and fits a desktop window', async (page) => {
   await page.emulateMedia({ colorScheme: 'dark' });
   await page.setViewportSize({ width: 1280, height: 800 });
   await page.goto(suite.address + '/LTE/Serving%20Cell%20Meas');
@@ -89,12 +80,10 @@ test('follows the dark mode of the system and fits a desktop window', async () =
   const width = await page.evaluate(() => document.querySelector('main').getBoundingClientRect().width);
   assert.ok(width <= 760, `the table is ${width}px wide`);
   await screenshot(page, 'lte-serving-cell-meas-desktop-dark');
-  assert.deepEqual(problems, []);
-  await page.close();
 });
 
 test('answers an unknown address with a page that leads home', async () => {
-  const { page } = await newPage();
+  const { page } = await openPage(suite.browser);
   const response = await page.goto(suite.address + '/LTE/No%20Such%20Thing');
   assert.equal(response.status(), 404);
   assert.equal(await title(page), 'Not Found');

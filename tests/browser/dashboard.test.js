@@ -1,12 +1,9 @@
 'use strict';
 
 const assert = require('node:assert/strict');
-const { test } = require('node:test');
-const { norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
+const { norvoForTheseTests, screenshot, testOnPage } = require('./norvo.js');
 
 const suite = norvoForTheseTests();
-
-const newPage = () => openPage(suite.browser);
 
 // The card's rows as label to value.
 const cardRows = (page) =>
@@ -17,22 +14,12 @@ const cardRows = (page) =>
     return rows;
   });
 
-test('opens from the launch screen, whose rows stay as they are', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'opens from the launch screen, whose rows stay as they are, and fills the card and the graphs', async (page) => {
   await page.goto(suite.address + '/');
   assert.deepEqual(await page.locator('main .row .text').allTextContents(), ['Device Info', 'LTE', 'UMTS', 'GSM']);
   await page.locator('.bar .links').getByRole('link', { name: 'Dashboard' }).click();
   await page.waitForURL(suite.address + '/dashboard');
   assert.equal(await page.locator('.bar h1').textContent(), 'Dashboard');
-  await page.locator('.bar .back').click();
-  await page.waitForURL(suite.address + '/');
-  assert.deepEqual(problems, []);
-  await page.close();
-});
-
-test('fills the card and the graphs from the simulated phone', async () => {
-  const { page, problems } = await newPage();
-  await page.goto(suite.address + '/dashboard');
   await page.waitForFunction(
     () => [...document.querySelectorAll('#cell dt')].some((term) => term.textContent === 'Downlink'),
     null,
@@ -64,12 +51,11 @@ test('fills the card and the graphs from the simulated phone', async () => {
   assert.equal(imsi.length, 3);
   assert.match(imsi.join(''), /^\d{15}$/);
   await screenshot(page, 'dashboard-phone');
-  assert.deepEqual(problems, []);
-  await page.close();
+  await page.locator('.bar .back').click();
+  await page.waitForURL(suite.address + '/');
 });
 
-test('keeps a graph\'s zoom across a refresh', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'keeps a graph\'s zoom across a refresh', async (page) => {
   await page.setViewportSize({ width: 1280, height: 900 });
   await page.goto(suite.address + '/dashboard');
   await page.waitForFunction(
@@ -101,6 +87,4 @@ test('keeps a graph\'s zoom across a refresh', async () => {
   await page.locator('#live').click();
   await page.waitForFunction(() => !location.hash.includes('from='));
   await screenshot(page, 'dashboard-desktop');
-  assert.deepEqual(problems, []);
-  await page.close();
 });

@@ -7,7 +7,7 @@ const fs = require('node:fs');
 const net = require('node:net');
 const os = require('node:os');
 const path = require('node:path');
-const { after, before } = require('node:test');
+const { after, before, test } = require('node:test');
 const { chromium } = require('playwright-core');
 
 const repository = path.resolve(__dirname, '..', '..');
@@ -136,6 +136,17 @@ async function openPage(browser) {
   return { page, problems };
 }
 
+// A test of `name` on a new page of the suite's browser that fails on any script or console error
+// the page meets, and closes the page after.
+function testOnPage(suite, name, body) {
+  test(name, async () => {
+    const { page, problems } = await openPage(suite.browser);
+    await body(page);
+    assert.deepEqual(problems, []);
+    await page.close();
+  });
+}
+
 // A Norvo and a browser for the tests of one file, stopped cleanly after them; the answer holds
 // `address` and `browser` once the tests run. `args` may be a function of a scratch folder,
 // removed after the tests, that prepares what Norvo reads; `port` as startNorvo takes it.
@@ -171,6 +182,7 @@ module.exports = {
   stopCleanly,
   startBrowser,
   openPage,
+  testOnPage,
   norvoForTheseTests,
   screenshot,
 };

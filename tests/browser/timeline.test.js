@@ -6,8 +6,7 @@ const assert = require('node:assert/strict');
 const { spawnSync } = require('node:child_process');
 const fs = require('node:fs');
 const path = require('node:path');
-const { test } = require('node:test');
-const { program, norvoForTheseTests, openPage, screenshot } = require('./norvo.js');
+const { program, norvoForTheseTests, screenshot, testOnPage } = require('./norvo.js');
 
 // A replay at full speed may hold the line that names its address in its output: given a port,
 // it is found by asking.
@@ -24,14 +23,11 @@ const suite = norvoForTheseTests((folder) => {
   return ['--replay', drive, '--speed', 'max', '--alerts', alerts];
 }, { port: true });
 
-const newPage = () => openPage(suite.browser);
+// The answer of GET `address` on the page's Norvo.
+const api = (page, address) => page.evaluate(async (url) => (await fetch(url)).json(), address);
+const replayState = (page) => api(page, '/api/replay');
 
-async function replayState(page) {
-  return page.evaluate(async () => (await fetch('/api/replay')).json());
-}
-
-test('lists what happened, failures first to the eye, and shows the metric behind one', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'lists what happened, failures first to the eye, and shows the metric behind one', async (page) => {
   await page.goto(suite.address + '/');
   assert.deepEqual(await page.locator('main .row .text').allTextContents(), ['Device Info', 'LTE', 'UMTS', 'GSM']);
   await page.locator('.bar .links').getByRole('link', { name: 'Timeline' }).click();
@@ -58,12 +54,9 @@ test('lists what happened, failures first to the eye, and shows the metric behin
     const items = [...document.querySelectorAll('.event')];
     return items.length > 0 && items.every((item) => item.classList.contains('failure'));
   });
-  assert.deepEqual(problems, []);
-  await page.close();
 });
 
-test('puts a player bar beside the tables that plays, pauses and seeks', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'puts a player bar beside the tables that plays, pauses and seeks', async (page) => {
   await page.goto(suite.address + '/LTE');
   const player = page.locator('.player');
   await player.waitFor();
@@ -73,14 +66,15 @@ test('puts a player bar beside the tables that plays, pauses and seeks', async (
   const ended = await replayState(page);
   assert.equal(ended.playing, false);
   assert.equal(ended.position_ms, ended.duration_ms);
-  const eventsAtEnd = await page.evaluate(async () => (await (await fetch('/api/events?limit=5000')).json()).events.length);
+  const eventCount = async () => (await api(page, '/api/events?limit=5000')).events.length;
+  const eventsAtEnd = await eventCount();
 
   const middle = Math.round(ended.duration_ms / 200) * 100;
   await page.locator('.player input.position').fill(String(middle));
   await page.waitForFunction((wanted) => document.querySelector('.player').dataset.position === String(wanted), middle);
   const seeked = await replayState(page);
   assert.equal(seeked.position_ms, middle);
-  const eventsAtMiddle = await page.evaluate(async () => (await (await fetch('/api/events?limit=5000')).json()).events.length);
+  const eventsAtMiddle = await eventCount();
   assert.ok(eventsAtMiddle < eventsAtEnd, `${eventsAtMiddle} events at the middle, ${eventsAtEnd} at the end`);
 
   await page.locator('.player select.speed').selectOption('1');
@@ -91,12 +85,9 @@ test('puts a player bar beside the tables that plays, pauses and seeks', async (
   await page.locator('.player button.play').click();
   await page.locator('.player button.play', { hasText: 'Play' }).waitFor();
   await screenshot(page, 'lte-with-player');
-  assert.deepEqual(problems, []);
-  await page.close();
 });
 
-test('shows active alerts as a banner above the tables, and their events', async () => {
-  const { page, problems } = await newPage();
+testOnPage(suite, 'shows active alerts as a banner above the tables, and their events', async (page) => {
   await page.goto(suite.address + '/LTE');
   // A moment on LTE, before the underpass.
   await page.evaluate(async () => {
@@ -116,8 +107,6 @@ test('shows active alerts as a banner above the tables, and their events', async
   assert.ok(bannerBottom <= tableTop + 1, 'the banner covers the table');
   await screenshot(page, 'lte-with-alert-banner');
 
-  const alerts = await page.evaluate(async () => (await (await fetch('/api/events?kind=alert')).json()).events);
+  const alerts = (await api(page, '/api/events?kind=alert')).events;
   assert.ok(alerts.some((event) => event.severity === 'warning' && event.text.startsWith('On LTE')));
-  assert.deepEqual(problems, []);
-  await page.close();
 });

@@ -20,7 +20,7 @@ class ChildProcess {
     std::filesystem::path standardOutput;
     std::filesystem::path standardError;
     // A descriptor of ours that the program receives as descriptor 3.
-    std::optional<int> descriptor3;
+    std::optional<int> descriptor3 = std::nullopt;
   };
 
   // Throws std::system_error when the program cannot be started.

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -22,6 +23,20 @@ inline tarn::ipc::Object withAppId(tarn::ipc::Object::Entries entries) {
 
 inline tarn::ipc::Object bytesOf(std::string_view text) {
   return tarn::ipc::Object::bytes(platform::Bytes(text.begin(), text.end()));
+}
+
+// Metrics that the bus tests send and expect.
+inline constexpr std::uint32_t kRrcState = 0x3C4E04;
+inline constexpr std::uint32_t kCaStatus = 0x3CD313;
+inline constexpr std::uint32_t kSimFiles = 0x3C0013;
+
+// The query of the app "vexmora" for the SIM files, under `triggerRef` when given.
+inline tarn::ipc::Object simFilesQuery(std::optional<std::int64_t> triggerRef = std::nullopt) {
+  tarn::ipc::Object::Entries entries;
+  if (triggerRef)
+    entries.push_back(entry(tarn::kKeyTriggerRef, tarn::ipc::Object::integer(*triggerRef)));
+  entries.push_back(entry(tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013)));
+  return withAppId(std::move(entries));
 }
 
 // The integer under `key`, or -1 when there is none.

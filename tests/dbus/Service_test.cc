@@ -40,10 +40,10 @@ using ::testing::HasSubstr;
 using ::testing::StartsWith;
 namespace status = tarn::status;
 
-constexpr std::uint32_t kRrcState = 0x3C4E04;
-constexpr std::uint32_t kCaStatus = 0x3CD313;
+using bustest::kCaStatus;
+using bustest::kRrcState;
+using bustest::kSimFiles;
 constexpr std::uint32_t kNeighbours = 0x3CD30F;
-constexpr std::uint32_t kSimFiles = 0x3C0013;
 
 Object metricRecord(std::uint32_t metricId, platform::Bytes payload, std::int64_t profileId) {
   return Object::dictionary({entry(tarn::kKeyMetricID, Object::integer(metricId)),
@@ -164,6 +164,8 @@ class AServiceOnABus : public ::testing::Test {
   tarn::dbus::Service service{core, tarn::dbus::connectToBus(bus.address())};
 };
 
+// A record of each shape that a command takes, and an answer of each kind, over the bus; the
+// service's own tests hold every fault it names.
 TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceGave) {
   RecordingSession session(transport);
   const struct {
@@ -185,23 +187,11 @@ TEST_F(AServiceOnABus, AnswersEveryCommandWithTheStatusAndMessageThatTheServiceG
       {tarn::kCommandClearConfiguration,
        Object::dictionary({entry(tarn::kKeyAppID, Object::text("2"))}),
        {status::kInvalidArgument, "argument kKeyAppID is not an integer"}},
-      {tarn::kCommandClearConfiguration,
-       Object::dictionary({entry(tarn::kKeyAppID, Object::integer(7))}),
-       {status::kUnknownAppId, "unknown app ID 7"}},
       {tarn::kCommandAddConfiguration,
        withAppId({entry(tarn::kKeyPayload, bytesOf("0x1\n0xZZ\n"))}),
        {status::kMalformedConfiguration,
         "malformed configuration: line 2: '0xZZ' is not a metric ID; write metric IDs in hex, "
         "like 0x3C4E04"}},
-      {tarn::kCommandAddConfiguration,
-       withAppId({entry(tarn::kKeyPayload, bytesOf("0x1")),
-                  entry(tarn::kKeyPayloadType, Object::integer(1))}),
-       {status::kInvalidArgument, "unsupported payload type 1"}},
-      {tarn::kCommandQueryMetric,
-       withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x3C0013))}),
-       {status::kInvalidArgument,
-        "trigger ID 0x3C0013 asks for no metric; on-demand triggers run from 0x7F0000 to "
-        "0x7FFFFF"}},
       {tarn::kCommandQueryMetric,
        withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F4E04))}),
        {status::kNoSuchMetric, "the baseband has no metric 0x3C4E04 to report"}},
@@ -231,9 +221,7 @@ TEST_F(AServiceOnABus, DeliversTheSubscribedMetricsAndQueryAnswersInTheirOrder) 
     expected.push_back(metricEvent(metricId, std::move(payload), 7));
   }
   source->flush();
-  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric,
-                            withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
-                                       entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
+  ASSERT_EQ(session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery(9999)),
             CommandResult{});
   expected.push_back({std::string(tarn::kEventTrigger),
                       withAppId({entry(tarn::kKeyTriggerRef, Object::integer(9999)),
@@ -259,10 +247,8 @@ TEST_F(AServiceOnABus, GivesEachClientOnlyWhatItsOwnConfigurationSubscribes) {
   source->flush();
   // Answers come after everything delivered before them, so the unconfigured session's first
   // events show that no metric reached it.
-  ASSERT_EQ(
-      unconfigured.perform(tarn::kCommandQueryMetric,
-                           withAppId({entry(tarn::kKeyTriggerID, Object::integer(0x7F0013))})),
-      CommandResult{});
+  ASSERT_EQ(unconfigured.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery()),
+            CommandResult{});
 
   EXPECT_EQ(rrc.waitFor(2),
             (std::vector{metricEvent(kRrcState, {1}, 0), metricEvent(kRrcState, {3}, 0)}));
@@ -279,33 +265,47 @@ TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKe
   const std::string session = owner.openSession("vexmora");
   EXPECT_THAT(session, StartsWith(tarn::dbus::kSessionPathPrefix));
   const std::string manager(tarn::dbus::kManagerPath);
-  const auto& sessionInterface = tarn::dbus::kSessionInterface;
-
-  EXPECT_EQ(errorOf([&] {
-              owner.call(manager, tarn::dbus::kManagerInterface, tarn::dbus::kOpenSession,
-                         [](sdbus::Message& m) { m << std::int32_t{2}; });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
-                         [](sdbus::Message& m) { m << std::string("ClearConfiguration"); });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(session, sessionInterface, tarn::dbus::kPerformCommand,
-                         [](sdbus::Message& m) {
-                           m << std::string("ClearConfiguration")
-                             << std::map<std::string, std::string>{{"kKeyAppID", "2"}};
-                         });
-            }),
-            "org.freedesktop.DBus.Error.InvalidArgs");
-  EXPECT_EQ(errorOf([&] { owner.call(manager, tarn::dbus::kManagerInterface, "Reboot"); }),
-            "org.freedesktop.DBus.Error.UnknownMethod");
-  EXPECT_EQ(errorOf([&] {
-              owner.call(std::string(tarn::dbus::kSessionPathPrefix) + "999999", sessionInterface,
-                         tarn::dbus::kClose);
-            }),
-            "org.freedesktop.DBus.Error.UnknownObject");
+  namespace dbus = tarn::dbus;
+  const auto clear = [](sdbus::Message& m) { m << std::string("ClearConfiguration"); };
+  const struct {
+    RawClient& client;
+    std::string path;
+    std::string_view interface, method;
+    RawClient::Append append;
+    std::string error;
+  } calls[] = {
+      {owner, manager, dbus::kManagerInterface, dbus::kOpenSession,
+       [](sdbus::Message& m) { m << std::int32_t{2}; }, "InvalidArgs"},
+      {owner, session, dbus::kSessionInterface, dbus::kPerformCommand, clear, "InvalidArgs"},
+      {owner, session, dbus::kSessionInterface, dbus::kPerformCommand,
+       [&](sdbus::Message& m) {
+         clear(m);
+         m << std::map<std::string, std::string>{{"kKeyAppID", "2"}};
+       },
+       "InvalidArgs"},
+      {owner, manager, dbus::kManagerInterface, "Reboot", {}, "UnknownMethod"},
+      {owner,
+       std::string(dbus::kSessionPathPrefix) + "999999",
+       dbus::kSessionInterface,
+       dbus::kClose,
+       {},
+       "UnknownObject"},
+      {intruder, session, dbus::kSessionInterface, dbus::kPerformCommand,
+       [&](sdbus::Message& m) {
+         clear(m);
+         dbus::appendRecord(m, withAppId({}));
+       },
+       "AccessDenied"},
+      {intruder, session, dbus::kSessionInterface, dbus::kSetEventsOn,
+       [](sdbus::Message& m) { m << true; }, "AccessDenied"},
+      {intruder, session, dbus::kSessionInterface, dbus::kClose, {}, "AccessDenied"},
+  };
+  for (const auto& call : calls) {
+    EXPECT_EQ(
+        errorOf([&] { call.client.call(call.path, call.interface, call.method, call.append); }),
+        "org.freedesktop.DBus.Error." + call.error)
+        << call.method;
+  }
 
   const CommandResult withABoolean =
       owner.perform(session, tarn::kCommandClearConfiguration, [](sdbus::Message& m) {
@@ -319,14 +319,6 @@ TEST_F(AServiceOnABus, RefusesMalformedCallsAndCallsOnAnotherClientsSessionAndKe
                                 {"kKeyAppID", sdbus::Variant(std::uint32_t{2})}};
                           }),
             CommandResult{});
-
-  EXPECT_EQ(
-      errorOf([&] { intruder.perform(session, tarn::kCommandClearConfiguration, withAppId({})); }),
-      "org.freedesktop.DBus.Error.AccessDenied");
-  EXPECT_EQ(errorOf([&] { intruder.setEventsOn(session, true); }),
-            "org.freedesktop.DBus.Error.AccessDenied");
-  EXPECT_EQ(errorOf([&] { intruder.call(session, sessionInterface, tarn::dbus::kClose); }),
-            "org.freedesktop.DBus.Error.AccessDenied");
 
   EXPECT_EQ(owner.perform(session, tarn::kCommandAddConfiguration,
                           withAppId({entry(tarn::kKeyPayload, bytesOf("0x3C4E04"))})),

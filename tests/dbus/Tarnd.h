@@ -16,12 +16,10 @@ inline std::unique_ptr<ChildProcess> startTarnd(const std::string& busAddress,
                                                 const std::filesystem::path& outputStem) {
   std::vector<std::string> arguments = {NORVO_TARND, "--bus", busAddress};
   arguments.insert(arguments.end(), options.begin(), options.end());
-  return std::make_unique<ChildProcess>(ChildProcess::Options{
-      .arguments = std::move(arguments),
-      .standardOutput = outputStem.string() + ".out",
-      .standardError = outputStem.string() + ".err",
-      .descriptor3 = std::nullopt,
-  });
+  return std::make_unique<ChildProcess>(
+      ChildProcess::Options{.arguments = std::move(arguments),
+                            .standardOutput = outputStem.string() + ".out",
+                            .standardError = outputStem.string() + ".err"});
 }
 
 }  // namespace bustest

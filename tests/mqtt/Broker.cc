@@ -123,9 +123,7 @@ void Broker::start() {
   process_ = std::make_unique<bustest::ChildProcess>(bustest::ChildProcess::Options{
       .arguments = {"mosquitto", "-c", (folder_ / "mosquitto.conf").string()},
       .standardOutput = stem + ".out",
-      .standardError = stem + ".err",
-      .descriptor3 = std::nullopt,
-  });
+      .standardError = stem + ".err"});
   if (!bustest::eventually([this] { return accepts(port_); }, 5s)) {
     throw std::runtime_error("mosquitto did not start: " + process_->standardError());
   }

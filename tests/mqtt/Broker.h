@@ -48,6 +48,8 @@ class Broker {
     return *tarn::mqtt::parseBrokerAddress(address(path, credentials)).address;
   }
 
+  // What the broker has logged since it last started.
+  std::string log() const { return process_->standardError(); }
   // Stops the broker with `signal` (SIGTERM lets it save its sessions) and waits for it.
   void stop(int signal);
   // Starts it again on the same port; throws as the constructor does.

@@ -3,15 +3,20 @@
 
 #include <boost/json/parse.hpp>
 #include <csignal>
+#include <fstream>
 
 #include "Broker.h"
 #include "Eventually.h"
+#include "PrivateBus.h"
 #include "RecordingSession.h"
 #include "Records.h"
 #include "Subscriber.h"
+#include "Tarnd.h"
 #include "TemporaryFolder.h"
-#include "platform/Base64.h"
 #include "platform/Log.h"
+#include "tarn/dbus/BusTransport.h"
+#include "tarn/dbus/Interface.h"
+#include "tarn/log/MetricLog.h"
 #include "tarn/mqtt/MqttTransport.h"
 #include "tarn/mqtt/Publisher.h"
 #include "tarn/mqtt/PublishingSource.h"
@@ -83,7 +88,6 @@ TEST(APublisher, DeliversEachLineByteForByteInOrderAtEitherQualityOfService) {
   for (const int qos : {0, 1}) {
     SCOPED_TRACE(qos);
     Subscriber subscriber(watching(broker, "fleet/#"));
-    ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
     Publisher publisher(publisherOptions(broker, qos, 1000));
     ASSERT_TRUE(eventually([&] { return publisher.counts().linked; }));
 
@@ -114,7 +118,6 @@ TEST(APublisher, HoldsMetricsWhileTheBrokerIsAwayAndDropsTheOldestPastItsBound) 
   options.clientId = "watcher";
   options.cleanSession = false;
   Subscriber subscriber(std::move(options));
-  ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
   platform::log::Capture log;
   constexpr std::size_t kBound = 50;
   Publisher publisher(publisherOptions(broker, 1, kBound));
@@ -159,26 +162,6 @@ TEST(APublisher, HoldsMetricsWhileTheBrokerIsAwayAndDropsTheOldestPastItsBound) 
             1u);
 }
 
-TEST(APublisher, RefusedForItsPasswordSaysSoOnceAndKeepsTakingMetrics) {
-  TemporaryFolder folder;
-  Broker broker(folder.path(),
-                {.account = std::pair("car", "right"), .tls = {}, .persistent = false});
-  platform::log::Capture log;
-  tarn::mqtt::PublisherOptions options = publisherOptions(broker, 1, 10);
-  options.broker = broker.linkAddress("fleet", "car:wrong");
-  Publisher publisher(std::move(options));
-  // The library tries again after 1, 2 and 4 s.
-  std::this_thread::sleep_for(3500ms);
-  for (const std::string& line : numberedLines(0, 20))
-    publisher.publish(line);
-
-  EXPECT_THAT(log.systemLines(),
-              ElementsAreArray({"tarnd: the broker at 127.0.0.1:" + std::to_string(broker.port()) +
-                                " refused the connection: Connection Refused: not authorised."}));
-  EXPECT_EQ(publisher.counts().accepted, 20u);
-  EXPECT_EQ(publisher.counts().dropped, 10u);
-}
-
 TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   TemporaryFolder folder;
   const mqtttest::TestCertificates certificates = mqtttest::makeTestCertificates(folder.path());
@@ -186,7 +169,6 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   LinkOptions watcher = watching(broker, "fleet/#");
   watcher.caFile = certificates.authority.string();
   Subscriber subscriber(std::move(watcher));
-  ASSERT_TRUE(eventually([&] { return subscriber.subscriptions() == 1; }));
 
   tarn::mqtt::PublisherOptions options = publisherOptions(broker, 1, 10);
   options.caFile = certificates.authority.string();
@@ -211,47 +193,17 @@ TEST(APublisher, ReachesATlsBrokerThroughTheAuthorityItIsGivenOnly) {
   EXPECT_THAT(log.systemLines(), ::testing::Contains(HasSubstr("certificate verify failed")));
 }
 
-constexpr std::uint32_t kRrcState = 0x3C4E04;
-constexpr std::uint32_t kCaStatus = 0x3CD313;
-constexpr std::uint32_t kSimFiles = 0x3C0013;
+using bustest::kCaStatus;
+using bustest::kRrcState;
+using bustest::kSimFiles;
 
 // The query a viewer sends for the SIM files.
 tarn::CommandResult querySimFiles(RecordingSession& session) {
-  return session.perform(tarn::kCommandQueryMetric,
-                         bustest::withAppId({bustest::entry(
-                             tarn::kKeyTriggerID, tarn::ipc::Object::integer(0x7F0013))}));
+  return session.perform(tarn::kCommandQueryMetric, bustest::simFilesQuery());
 }
 
 tarn::service::Metric metric(std::uint32_t metricId, std::uint8_t mark) {
   return {metricId, platform::Bytes{0x08, mark}};
-}
-
-TEST(AMetricMessage, IsReadOrRefusedWithTheReason) {
-  const std::string hugeButValid = R"({"kKeyMetricID":3952132,"kKeyPayload":")" +
-                                   platform::base64Encode(platform::Bytes(8 << 20, 1)) + R"("})";
-  const struct {
-    std::string message;
-    std::string error;
-  } cases[] = {
-      {R"({"kKeyMetricID":3952132,"kKeyPayload":"CAM=","t_ms":5,"device":"x","unix_ms":1})", ""},
-      {R"({"kKeyMetricID":3952132,"kKeyPayload":"CAM=")", "not JSON (incomplete JSON)"},
-      {R"([3952132,"CAM="])", "not a JSON object"},
-      {R"({"kKeyMetricID":3952132,"kKeyPayload":"C@M="})",
-       "\"kKeyPayload\" is not standard base64 text"},
-      {R"({"kKeyMetricID":1193046,"kKeyPayload":"CAM="})", "unknown metric ID 1193046"},
-      {R"({"kKeyMetricID":"0x3C4E04","kKeyPayload":"CAM="})", "no integer \"kKeyMetricID\""},
-      {R"({"kKeyMetricID":3952132})", "no \"kKeyPayload\""},
-      {hugeButValid, "too large (" + std::to_string(hugeButValid.size()) + " bytes)"},
-  };
-  for (const auto& [message, error] : cases) {
-    const tarn::mqtt::ReadMetric read = tarn::mqtt::readMetricMessage(message);
-    EXPECT_EQ(read.error, error) << message.substr(0, 80);
-    if (error.empty()) {
-      ASSERT_TRUE(read.metric);
-      EXPECT_EQ(read.metric->metricId, kRrcState);
-      EXPECT_EQ(read.metric->payload, (platform::Bytes{0x08, 0x03}));
-    }
-  }
 }
 
 // The viewer's session reaches the device through the broker as if its service ran here.
@@ -281,22 +233,27 @@ TEST(ARemoteDevice, ServesItsMetricsToSessionsAndRefusesWhatDoesNotRead) {
   const std::vector<std::string> messages = {
       line(kRrcState, 1),
       "{\"kKeyMetricID\": 3952132, oops",
+      R"([3952132,"CAM="])",
       line(kSimFiles, 2),
       R"({"kKeyMetricID":3952132,"kKeyPayload":"not base64!"})",
+      R"({"kKeyMetricID":"0x3C4E04","kKeyPayload":"CAM="})",
       line(0x3C4F6A, 3),  // not subscribed
       R"({"kKeyMetricID":4660,"kKeyPayload":"CAM="})",
+      R"({"kKeyMetricID":3952132})",
       std::string(10 << 20, '{'),
       line(kCaStatus, 4),
   };
   for (const std::string& message : messages) {
     ASSERT_TRUE(eventually([&] { return rogue.publish(topic, message, 1, false).has_value(); }));
   }
-  ASSERT_TRUE(eventually([&] { return transport->device().refused() == 4; }));
+  ASSERT_TRUE(eventually([&] { return transport->device().refused() == 7; }));
   const auto metricIds = [&] { return bustest::metricIdsOf(session.received()); };
   ASSERT_TRUE(eventually([&] { return metricIds().size() >= 2; }));
   EXPECT_EQ(metricIds(), (std::vector<std::int64_t>{kRrcState, kCaStatus}));
-  for (const std::string_view reason : {"not JSON", "is not standard base64",
-                                        "unknown metric ID 4660", "too large (10485760 bytes)"})
+  for (const std::string_view reason :
+       {"not JSON (", "not a JSON object", "\"kKeyPayload\" is not standard base64 text",
+        "no integer \"kKeyMetricID\"", "unknown metric ID 4660", "no \"kKeyPayload\"",
+        "too large (10485760 bytes)"})
     EXPECT_THAT(log.plainLines(), ::testing::Contains(HasSubstr(reason)));
 
   // A query is answered with the last metric of its kind that the device published.
@@ -338,6 +295,81 @@ TEST(ARemoteDevice, AnswersTheSimFilesQueryOfAViewerThatJoinsLate) {
     EXPECT_EQ(*answer.find(tarn::kKeyPayload)->asBytes(), (platform::Bytes{0x08, 3}));
   }
   source.stop();
+}
+
+std::unique_ptr<bustest::ChildProcess> startPublishingTarnd(const std::string& bus,
+                                                            const std::string& broker,
+                                                            std::vector<std::string> more,
+                                                            const std::filesystem::path& stem) {
+  std::vector<std::string> options = {"--source", "sim",       "--seed", "5",        "--speed",
+                                      "20",       "--publish", broker,   "--device", "car-1"};
+  options.insert(options.end(), more.begin(), more.end());
+  return bustest::startTarnd(bus, std::move(options), stem);
+}
+
+TEST(APublishingTarnd, PublishesWhatItRecordsAndLeavesALastWillWhenKilled) {
+  TemporaryFolder folder;
+  Broker broker(folder.path(), {});
+  const LinkOptions options = watching(broker, "fleet/#");
+  Subscriber subscriber(options);
+
+  auto tarnd =
+      startPublishingTarnd("none", broker.address("fleet"),
+                           {"--record", (folder / "drive.jsonl").string()}, folder / "tarnd");
+  ASSERT_TRUE(eventually([&] { return subscriber.payloadsOn(kMetrics).size() >= 20; }))
+      << tarnd->standardOutput() << tarnd->standardError();
+  EXPECT_EQ(lastStatus(subscriber)["status"], "online");
+
+  tarnd->stop(SIGKILL, 5s);
+  ASSERT_TRUE(eventually([&] { return lastStatus(subscriber)["status"] == "offline"; }));
+  // Retained, for whoever looks later.
+  Subscriber later(options);
+  EXPECT_TRUE(eventually([&] { return lastStatus(later)["status"] == "offline"; }));
+
+  // Each message is the recorded line with the device and the wall-clock time added.
+  std::ifstream recorded(folder / "drive.jsonl");
+  tarn::log::MetricLogReader reader(recorded);
+  for (const std::string& message : subscriber.payloadsOn(kMetrics)) {
+    const tarn::log::ParsedLine published = tarn::log::parseMetricLogLine(message);
+    ASSERT_TRUE(published.entry) << published.error;
+    const auto line = reader.next();
+    ASSERT_TRUE(line && line->parsed.entry);
+    platform::Dictionary record = published.entry->record;
+    EXPECT_EQ(*record.find("device"), platform::Value("car-1"));
+    EXPECT_TRUE(record.find("unix_ms") && record.find("unix_ms")->asInteger() > 1'700'000'000'000);
+    record.erase("device");
+    record.erase("unix_ms");
+    EXPECT_EQ(record, line->parsed.entry->record);
+  }
+}
+
+TEST(APublishingTarnd, RefusedByTheBrokerSaysSoOnceAndServesItsLocalClients) {
+  TemporaryFolder folder;
+  Broker broker(folder.path(),
+                {.account = std::pair("car", "right"), .tls = {}, .persistent = false});
+  bustest::PrivateBus bus;
+  tarn::dbus::BusTransport transport(bus.address());
+  auto tarnd = startPublishingTarnd(bus.address(), broker.address("fleet", "car:wrong"), {},
+                                    folder / "tarnd");
+  ASSERT_TRUE(bus.waitForName(tarn::dbus::kBusName, true)) << tarnd->standardError();
+  {
+    bustest::RecordingSession session(transport);
+    ASSERT_EQ(session.configure("0x3CD301\n0x3C4F6A\n0x3CD302\n0x3CD102\n0x3CD002\n"),
+              tarn::CommandResult{});
+    EXPECT_GE(session.waitFor(10).size(), 10u);
+  }
+  const std::string refused = "tarnd: the broker at 127.0.0.1:" + std::to_string(broker.port()) +
+                              " refused the connection: Connection Refused: not authorised.\n";
+  // Said once, though the library tries again after 1 s, 2 s, 4 s...
+  ASSERT_TRUE(eventually([&] {
+    const std::string log = broker.log();
+    return log.find("not authorised") != log.rfind("not authorised");
+  })) << broker.log();
+  EXPECT_FALSE(tarnd->wait(0ms));
+  const std::string output = tarnd->standardError();
+  EXPECT_NE(output.find(refused), std::string::npos) << output;
+  EXPECT_EQ(output.find("refused"), output.rfind("refused")) << output;
+  EXPECT_EQ(tarnd->stop(SIGTERM, 10s), 0);
 }
 
 }  // namespace

@@ -1,15 +1,13 @@
 #include "Subscriber.h"
 
+#include "Eventually.h"
+
 namespace mqtttest {
 
 Subscriber::Subscriber(tarn::mqtt::LinkOptions options)
     : link_((options.name = "subscriber", std::move(options)),
             tarn::mqtt::Link::Handlers{
-                .connected =
-                    [this] {
-                      const std::lock_guard lock(mutex_);
-                      ++connections_;
-                    },
+                .connected = {},
                 .disconnected = {},
                 .published = {},
                 .message =
@@ -20,10 +18,14 @@ Subscriber::Subscriber(tarn::mqtt::LinkOptions options)
                 .subscribed =
                     [this] {
                       const std::lock_guard lock(mutex_);
-                      ++subscriptions_;
+                      subscribed_ = true;
                     },
             }) {
   link_.start();
+  bustest::eventually([this] {
+    const std::lock_guard lock(mutex_);
+    return subscribed_;
+  });
 }
 
 std::vector<std::string> Subscriber::payloadsOn(std::string_view topic) const {
@@ -33,20 +35,6 @@ std::vector<std::string> Subscriber::payloadsOn(std::string_view topic) const {
     if (on == topic) payloads.push_back(payload);
   }
   return payloads;
-}
-
-std::size_t Subscriber::connections() const {
-  const std::lock_guard lock(mutex_);
-  return connections_;
-}
-
-}  // namespace mqtttest
-
-namespace mqtttest {
-
-std::size_t Subscriber::subscriptions() const {
-  const std::lock_guard lock(mutex_);
-  return subscriptions_;
 }
 
 }  // namespace mqtttest

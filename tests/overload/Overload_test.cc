@@ -1,13 +1,12 @@
-// Norvo and tarnd as a user runs them, offered more than they can take: a drive replayed without
-// pauses, looping, and the simulator at its fastest. The assertions are on what must hold however
-// loaded the machine is: nothing lost where the source can be held back, memory within bounds,
-// every page answered, and a prompt end on SIGINT or SIGTERM.
+// Norvo as a user runs it, offered more than it can take: a drive replayed without pauses,
+// looping, and the simulator at its fastest. The assertions are on what must hold however loaded
+// the machine is: nothing lost where the source can be held back, memory within bounds, every
+// page answered, and a prompt end on SIGINT or SIGTERM.
 #include <gtest/gtest.h>
 
 #include <boost/json/parse.hpp>
 #include <csignal>
 #include <fstream>
-#include <sstream>
 
 #include "ChildProcess.h"
 #include "Eventually.h"
@@ -24,10 +23,12 @@ using namespace std::chrono_literals;
 using bustest::ChildProcess;
 using bustest::contentsOf;
 using bustest::eventually;
-using bustest::freePort;
 using bustest::get;
 
 constexpr std::uint64_t kStartMs = 1'700'000'000'000;
+// Three simulated minutes: several of the replay's batches of 200 metrics, written and looped
+// over within moments even under AddressSanitizer.
+constexpr std::uint64_t kDriveMs = 3 * 60 * 1000;
 // The bound that Norvo's resident memory must stay under, whatever the rate offered. Under
 // AddressSanitizer freed memory waits in a quarantine of up to 256 MB, with shadow memory
 // besides; the bound then still catches growth without end (gigabytes in seconds).
@@ -36,25 +37,6 @@ constexpr std::uint64_t kMostResidentKiB = 400 * 1024;
 #else
 constexpr std::uint64_t kMostResidentKiB = 100 * 1024;
 #endif
-
-// One simulated hour of the drive, the metrics the shipped configuration subscribes to, as a
-// metric log with their delivery times. Answers how many lines it wrote.
-std::size_t writeDrive(const std::filesystem::path& path) {
-  const auto configuration = tarn::service::Configuration::parse(
-      contentsOf(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
-  tarn::sim::Simulator simulator(11, kStartMs);
-  std::ofstream out(path);
-  tarn::log::MetricLogWriter writer(out);
-  std::size_t lines = 0;
-  for (const tarn::sim::TimedMetric& timed : simulator.advance(3600 * 1000)) {
-    if (!configuration.profileOf(timed.metric.metricId)) continue;
-    writer.write({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
-                  {"kKeyPayload", timed.metric.payload}},
-                 static_cast<std::int64_t>(timed.atMs - kStartMs));
-    ++lines;
-  }
-  return lines;
-}
 
 // The peak resident memory of a running process, from /proc.
 std::uint64_t peakResidentKiB(pid_t pid) {
@@ -65,46 +47,68 @@ std::uint64_t peakResidentKiB(pid_t pid) {
   return 0;
 }
 
-std::unique_ptr<ChildProcess> startNorvo(std::vector<std::string> arguments,
-                                         const std::filesystem::path& errors,
-                                         std::filesystem::path output = "/dev/null") {
-  arguments.insert(arguments.begin(), NORVO_VIEWER);
-  return std::make_unique<ChildProcess>(ChildProcess::Options{
-      .arguments = std::move(arguments),
-      .standardOutput = std::move(output),
-      .standardError = errors,
-      .descriptor3 = std::nullopt,
-  });
-}
-
 class OverloadTest : public ::testing::Test {
  protected:
   static void SetUpTestSuite() {
     folder_ = new bustest::TemporaryFolder;
-    lines_ = writeDrive(drive());
+    lines_ = 0;
   }
   static void TearDownTestSuite() { delete folder_; }
 
-  static std::filesystem::path drive() { return *folder_ / "drive.jsonl"; }
   static std::filesystem::path file(const std::string& name) { return *folder_ / name; }
+
+  // The drive's metrics that the shipped configuration subscribes to, as a metric log with
+  // their delivery times; written when first asked for.
+  static std::filesystem::path drive() {
+    const std::filesystem::path path = file("drive.jsonl");
+    if (lines_ > 0) return path;
+    const auto configuration = tarn::service::Configuration::parse(
+        contentsOf(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));
+    tarn::sim::Simulator simulator(11, kStartMs);
+    std::ofstream out(path);
+    tarn::log::MetricLogWriter writer(out);
+    for (const tarn::sim::TimedMetric& timed : simulator.advance(kDriveMs)) {
+      if (!configuration.profileOf(timed.metric.metricId)) continue;
+      writer.write({{"kKeyMetricID", std::int64_t{timed.metric.metricId}},
+                    {"kKeyPayload", timed.metric.payload}},
+                   static_cast<std::int64_t>(timed.atMs - kStartMs));
+      ++lines_;
+    }
+    return path;
+  }
+
+  static std::unique_ptr<ChildProcess> startNorvo(std::vector<std::string> arguments,
+                                                  const std::string& name,
+                                                  std::filesystem::path output = "/dev/null") {
+    arguments.insert(arguments.begin(), NORVO_VIEWER);
+    return std::make_unique<ChildProcess>(
+        ChildProcess::Options{.arguments = std::move(arguments),
+                              .standardOutput = std::move(output),
+                              .standardError = file(name + ".err")});
+  }
+
+  // A replay of the drive at full speed, listening on `port`.
+  static std::unique_ptr<ChildProcess> replay(int port, std::vector<std::string> more = {}) {
+    std::vector<std::string> arguments = {
+        "--replay", drive(), "--speed", "max", "--listen", "127.0.0.1:" + std::to_string(port)};
+    arguments.insert(arguments.end(), more.begin(), more.end());
+    return startNorvo(std::move(arguments), "replay" + std::to_string(port));
+  }
 
   static inline bustest::TemporaryFolder* folder_ = nullptr;
   static inline std::size_t lines_ = 0;
 };
 
 TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoes) {
-  ASSERT_GT(lines_, 5000u);
-  auto intake =
-      startNorvo({"intake", drive(), "--dump-store", file("intake.json")}, file("intake.err"));
+  auto intake = startNorvo({"intake", drive(), "--dump-store", file("intake.json")}, "intake");
+  ASSERT_GT(lines_, 800u);
   ASSERT_EQ(intake->wait(60s), 0) << intake->standardError();
   std::string expected = contentsOf(file("intake.json"));
   ASSERT_TRUE(expected.ends_with('\n'));
   expected.pop_back();
 
-  const int port = freePort();
-  auto norvo = startNorvo(
-      {"--replay", drive(), "--speed", "max", "--listen", "127.0.0.1:" + std::to_string(port)},
-      file("replay.err"));
+  const int port = bustest::freePort();
+  auto norvo = replay(port);
   std::optional<std::string> store;
   EXPECT_TRUE(eventually([&] { return (store = get(port, "/api/store")) == expected; }, 60s))
       << norvo->standardError();
@@ -115,7 +119,7 @@ TEST_F(OverloadTest, AReplayWithoutPausesFillsTheStoreAsTheIntakeOfTheSameLogDoe
 }
 
 TEST_F(OverloadTest, TheIntakeFailsWhenItsLogLinesCannotBeWritten) {
-  auto intake = startNorvo({"intake", drive()}, file("full.err"), "/dev/full");
+  auto intake = startNorvo({"intake", drive()}, "full", "/dev/full");
   EXPECT_EQ(intake->wait(60s), 1);
   EXPECT_NE(intake->standardError().find("norvo intake: cannot write the log lines to standard "
                                          "output: No space left on device"),
@@ -123,33 +127,45 @@ TEST_F(OverloadTest, TheIntakeFailsWhenItsLogLinesCannotBeWritten) {
       << intake->standardError();
 }
 
+// Whether the replay on `port` is seen to start over `count` times: asked again and again, its
+// position comes back before where it was.
+bool startsOver(int port, int count) {
+  int passes = 0;
+  std::int64_t last = 0;
+  return eventually(
+      [&] {
+        const std::optional<std::string> state = get(port, "/api/replay");
+        const std::int64_t at =
+            state ? boost::json::parse(*state).at("position_ms").as_int64() : last;
+        passes += at < last;
+        last = at;
+        return passes >= count;
+      },
+      60s);
+}
+
 TEST_F(OverloadTest, ALoopingReplayWithoutPausesStaysSmallAnswersEveryPageAndEndsOnASignal) {
   for (const int signal : {SIGINT, SIGTERM}) {
-    const int port = freePort();
-    auto norvo = startNorvo({"--replay", drive(), "--speed", "max", "--loop", "--listen",
-                             "127.0.0.1:" + std::to_string(port)},
-                            file("loop.err"));
+    const int port = bustest::freePort();
+    auto norvo = replay(port, {"--loop"});
     ASSERT_TRUE(eventually([&] { return get(port, "/").has_value(); }, 20s))
         << norvo->standardError();
-    const auto until = std::chrono::steady_clock::now() + 3s;
-    std::size_t answered = 0;
-    for (const char* page : {"/", "/LTE", "/api/screens/LTE/CA%20Status", "/api/store"}) {
-      ASSERT_TRUE(get(port, page)) << page;
-      ++answered;
+    // One run is enough to see it loop, stay small and answer every page meanwhile.
+    if (signal == SIGINT) {
+      ASSERT_TRUE(startsOver(port, 3));
+      for (const char* page : {"/", "/LTE", "/api/screens/LTE/CA%20Status", "/api/store",
+                               "/LTE/Serving%20Cell%20Info"})
+        EXPECT_TRUE(get(port, page)) << page;
+      EXPECT_LT(peakResidentKiB(norvo->pid()), kMostResidentKiB);
     }
-    while (std::chrono::steady_clock::now() < until) {
-      ASSERT_TRUE(get(port, "/LTE/Serving%20Cell%20Info"));
-      ++answered;
-    }
-    EXPECT_GT(answered, 4u);
-    EXPECT_LT(peakResidentKiB(norvo->pid()), kMostResidentKiB);
     EXPECT_EQ(norvo->stop(signal, 10s), 0) << norvo->standardError();
   }
 }
 
 TEST_F(OverloadTest, TheSimulatorAtItsFastestRecordsForTheTimeAskedAndStaysSmall) {
-  auto record = startNorvo({"record", file("fast.jsonl"), "--seconds", "1", "--speed", "10000"},
-                           file("record.err"));
+  auto absurd = startNorvo({"record", file("absurd.jsonl"), "--speed", "1e9"}, "absurd");
+  auto record =
+      startNorvo({"record", file("fast.jsonl"), "--seconds", "1", "--speed", "10000"}, "record");
   std::uint64_t peak = 0;
   EXPECT_TRUE(eventually(
       [&] {
@@ -163,7 +179,6 @@ TEST_F(OverloadTest, TheSimulatorAtItsFastestRecordsForTheTimeAskedAndStaysSmall
   // ended on time and small.
   EXPECT_GT(bustest::lineCount(file("fast.jsonl")), 0u);
 
-  auto absurd = startNorvo({"record", file("absurd.jsonl"), "--speed", "1e9"}, file("absurd.err"));
   EXPECT_EQ(absurd->wait(10s), 2);
   EXPECT_NE(absurd->standardError().find("--speed of the simulator is at most 10000, not 1e9"),
             std::string::npos)

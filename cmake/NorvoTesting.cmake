@@ -1,11 +1,12 @@
-# GoogleTest's headers, compiled once and shared by every test binary: parsing them took a few
-# seconds of each test translation unit.
+# GoogleTest's headers and the common ones, compiled once and shared by every test binary: parsing
+# them took a few seconds of each test translation unit.
 function(norvo_add_test_pch)
   file(CONFIGURE OUTPUT ${CMAKE_BINARY_DIR}/norvo_test_pch.cc CONTENT "")
   add_library(norvo_test_pch OBJECT ${CMAKE_BINARY_DIR}/norvo_test_pch.cc)
   target_compile_options(norvo_test_pch PRIVATE -O0)
   target_link_libraries(norvo_test_pch PRIVATE GTest::gtest GTest::gmock)
-  target_precompile_headers(norvo_test_pch PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
+  target_precompile_headers(norvo_test_pch PRIVATE ${NORVO_COMMON_HEADERS} <gmock/gmock.h>
+                            <gtest/gtest.h>)
 endfunction()
 
 # norvo_add_test(<name> SOURCES <files...> LIBS <targets...>)

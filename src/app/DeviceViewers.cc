@@ -13,6 +13,8 @@
 #include <thread>
 #include <vector>
 
+#include "ui/web/Access.h"
+
 namespace app {
 
 namespace {
@@ -55,11 +57,13 @@ std::string_view hostName(std::string_view host) {
 }  // namespace
 
 DeviceViewers::DeviceViewers(tarn::mqtt::BrokerAddress broker, std::optional<std::string> caFile,
-                             boost::asio::ip::address listen, std::optional<TlsFiles> tls)
+                             boost::asio::ip::address listen, std::optional<TlsFiles> tls,
+                             std::optional<std::string> token)
     : broker_(std::move(broker)),
       caFile_(std::move(caFile)),
       listen_(listen),
-      tls_(std::move(tls)) {}
+      tls_(std::move(tls)),
+      token_(std::move(token)) {}
 
 DeviceViewers::~DeviceViewers() {
   for (const auto& [device, viewer] : viewers_)
@@ -81,8 +85,10 @@ std::optional<std::string> DeviceViewers::open(const std::string& device, std::s
     if (!viewer) return std::nullopt;
     found = viewers_.emplace(device, *viewer).first;
   }
-  return (tls_ ? "https://" : "http://") + std::string(hostName(host)) + ":" +
-         std::to_string(found->second.port) + "/";
+  std::string address = (tls_ ? "https://" : "http://") + std::string(hostName(host)) + ":" +
+                        std::to_string(found->second.port) + "/";
+  if (token_) address += "?" + std::string(ui::web::Access::kQueryKey) + "=" + *token_;
+  return address;
 }
 
 std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& device,
@@ -102,6 +108,26 @@ std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& dev
   if (caFile_) arguments.insert(arguments.end(), {"--mqtt-ca", *caFile_});
   if (tls_)
     arguments.insert(arguments.end(), {"--tls-cert", tls_->certificate, "--tls-key", tls_->key});
+  // The token reaches the viewer through a pipe on its standard input, where no other process
+  // can read it, rather than in its arguments or a file.
+  int tokenPipe[2] = {-1, -1};
+  if (token_) {
+    if (::pipe2(tokenPipe, O_CLOEXEC) != 0) {
+      why = "cannot start a viewer for " + device;
+      return std::nullopt;
+    }
+    const std::string line = *token_ + "\n";
+    // The token is far shorter than a pipe holds, so the write neither blocks nor comes short.
+    const bool written =
+        ::write(tokenPipe[1], line.data(), line.size()) == static_cast<ssize_t>(line.size());
+    ::close(tokenPipe[1]);
+    if (!written) {
+      ::close(tokenPipe[0]);
+      why = "cannot start a viewer for " + device;
+      return std::nullopt;
+    }
+    arguments.insert(arguments.end(), {"--token-file", "/dev/stdin"});
+  }
   std::vector<char*> argv;
   for (std::string& argument : arguments)
     argv.push_back(argument.data());
@@ -112,7 +138,7 @@ std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& dev
     // Only calls that are safe between fork and exec in a program with threads.
     ::prctl(PR_SET_PDEATHSIG, SIGTERM);
     const int null = ::open("/dev/null", O_RDWR);
-    ::dup2(null, STDIN_FILENO);
+    ::dup2(tokenPipe[0] >= 0 ? tokenPipe[0] : null, STDIN_FILENO);
     ::dup2(null, STDOUT_FILENO);
     ::dup2(null, STDERR_FILENO);
     // Nothing of ours, such as the fleet's listening socket, stays open in the viewer.
@@ -120,6 +146,7 @@ std::optional<DeviceViewers::Viewer> DeviceViewers::start(const std::string& dev
     ::execv(argv[0], argv.data());
     ::_exit(127);
   }
+  if (tokenPipe[0] >= 0) ::close(tokenPipe[0]);
   if (pid < 0) {
     why = "cannot start a viewer for " + device;
     return std::nullopt;

@@ -25,10 +25,12 @@ struct TlsFiles {
 // first opened and kept while it runs. The viewers end with this object, or with the process.
 class DeviceViewers {
  public:
-  // `broker`'s path is the prefix; viewers listen on `listen`, on ports the system picks, and
-  // serve HTTPS with `tls` when set.
+  // `broker`'s path is the prefix; viewers listen on `listen`, on ports the system picks, serve
+  // HTTPS with `tls` when set, and ask for `token` when set (the fleet's own, so that the
+  // browser's cookie opens them too).
   DeviceViewers(tarn::mqtt::BrokerAddress broker, std::optional<std::string> caFile,
-                boost::asio::ip::address listen, std::optional<TlsFiles> tls = std::nullopt);
+                boost::asio::ip::address listen, std::optional<TlsFiles> tls = std::nullopt,
+                std::optional<std::string> token = std::nullopt);
   ~DeviceViewers();
   DeviceViewers(const DeviceViewers&) = delete;
   DeviceViewers& operator=(const DeviceViewers&) = delete;
@@ -51,6 +53,7 @@ class DeviceViewers {
   const std::optional<std::string> caFile_;
   const boost::asio::ip::address listen_;
   const std::optional<TlsFiles> tls_;
+  const std::optional<std::string> token_;
   std::mutex mutex_;
   std::map<std::string, Viewer> viewers_;
 };

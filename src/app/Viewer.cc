@@ -120,22 +120,6 @@ struct GivenOptions {
   bool noAuth = false;
 };
 
-// The access token in `path`: its first line, which may hold only what an address and a cookie
-// carry as they are.
-std::optional<std::string> readToken(std::string_view path) {
-  std::ifstream file{std::string(path)};
-  std::string token;
-  if (!file || !std::getline(file, token)) return std::nullopt;
-  while (!token.empty() && std::isspace(static_cast<unsigned char>(token.back())))
-    token.pop_back();
-  const bool plain = std::all_of(token.begin(), token.end(), [](char c) {
-    return std::isalnum(static_cast<unsigned char>(c)) || c == '-' || c == '.' || c == '_' ||
-           c == '~';
-  });
-  if (token.empty() || !plain) return std::nullopt;
-  return token;
-}
-
 // Empty, after saying why on standard error, when the values make no sense.
 std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
   const auto& [listen, service, replay, speed, source, refresh, log, caFile, alerts, tokenFile,
@@ -148,12 +132,10 @@ std::optional<ViewerOptions> judgeOptions(const GivenOptions& given) {
   }
   if (tokenFile && noAuth) return refuse("--token-file and --no-auth exclude each other");
   if (tokenFile) {
-    options.display.token = readToken(*tokenFile);
+    options.display.token = ui::web::Access::readToken(*tokenFile);
     if (!options.display.token) {
-      return refuse(platform::format(
-          "--token-file %s: the file's first line must hold the token, made of letters, digits "
-          "and - . _ ~",
-          *tokenFile));
+      return refuse(
+          platform::format("--token-file %s: %s", *tokenFile, ui::web::Access::kTokenFileRule));
     }
   } else if (!options.display.listen.address().is_loopback()) {
     if (noAuth) {

@@ -1,7 +1,8 @@
 'use strict';
 
 // The fleet page with 50 simulated phones, each with its own seed, publishing through a
-// Mosquitto broker of the test's own.
+// Mosquitto broker of the test's own. The fleet asks for an access token, as it does when shown
+// beyond this machine, and hands it to the devices' viewers.
 const assert = require('node:assert/strict');
 const { spawn } = require('node:child_process');
 const fs = require('node:fs');
@@ -15,6 +16,7 @@ const { freePort, program, screenshot, startBrowser, startProgram, stopCleanly, 
 const fleetSim = process.env.NORVO_FLEET_SIM ??
     path.join(path.dirname(program), '..', '..', 'tools', 'fleetsim', 'norvo-fleet-sim');
 const kDevices = 50;
+const kToken = 'fleet-token_1.2~3';
 
 let folder;
 let broker;
@@ -47,8 +49,10 @@ before(async () => {
   const url = `mqtt://127.0.0.1:${port}/fleet`;
   devices = spawn(fleetSim, ['--publish', url, '--devices', String(kDevices)],
                   { stdio: ['ignore', 'ignore', 'inherit'] });
-  fleet = startProgram(['--fleet', url, '--listen', '127.0.0.1:0'],
-                       /Open (http:\/\/127\.0\.0\.1:\d+)\/fleet in a browser/);
+  const tokenFile = path.join(folder, 'token');
+  fs.writeFileSync(tokenFile, kToken + '\n');
+  fleet = startProgram(['--fleet', url, '--listen', '127.0.0.1:0', '--token-file', tokenFile],
+                       /Open (http:\/\/127\.0\.0\.1:\d+)\/fleet\?token=fleet-token_1\.2~3 in a browser/);
   address = await fleet.address;
   suite.browser = await startBrowser();
 });
@@ -66,8 +70,10 @@ const column = (page, index) =>
   page.locator(`#fleet tbody tr td:nth-child(${index})`).allTextContents();
 
 testOnPage(suite, 'lists every device live, sorts, filters and opens a device\'s own screens', async (page) => {
+  assert.equal((await fetch(address + '/fleet')).status, 401);
   await page.setViewportSize({ width: 1280, height: 900 });
-  await page.goto(address + '/fleet');
+  await page.goto(`${address}/fleet?token=${kToken}`);
+  assert.equal(page.url(), address + '/fleet');
 
   await page.waitForFunction((count) =>
       document.querySelectorAll('#fleet tbody tr').length === count &&

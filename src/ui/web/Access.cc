@@ -1,6 +1,8 @@
 #include "ui/web/Access.h"
 
+#include <algorithm>
 #include <boost/beast/http/field.hpp>
+#include <cctype>
 #include <fstream>
 #include <stdexcept>
 
@@ -101,6 +103,20 @@ std::string Access::makeToken() {
   std::string token;
   for (const unsigned char byte : bytes)
     token += platform::format("%02x", byte);
+  return token;
+}
+
+std::optional<std::string> Access::readToken(std::string_view path) {
+  std::ifstream file{std::string(path)};
+  std::string token;
+  if (!file || !std::getline(file, token)) return std::nullopt;
+  while (!token.empty() && std::isspace(static_cast<unsigned char>(token.back())))
+    token.pop_back();
+  const bool plain = std::all_of(token.begin(), token.end(), [](char c) {
+    return std::isalnum(static_cast<unsigned char>(c)) || c == '-' || c == '.' || c == '_' ||
+           c == '~';
+  });
+  if (token.empty() || !plain) return std::nullopt;
   return token;
 }
 

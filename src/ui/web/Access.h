@@ -29,6 +29,12 @@ class Access {
   // when there is no such source.
   static std::string makeToken();
 
+  // The token in the file at `path`: its first line, which may hold only what an address and a
+  // cookie carry as they are; empty when it holds anything else, as kTokenFileRule says.
+  static std::optional<std::string> readToken(std::string_view path);
+  static constexpr std::string_view kTokenFileRule =
+      "the file's first line must hold the token, made of letters, digits and - . _ ~";
+
  private:
   bool matches(std::string_view candidate) const;
 

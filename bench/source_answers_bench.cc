@@ -101,7 +101,7 @@ template <std::unique_ptr<MetricSource> (*Make)()>
 void BM_QueryWhileRunning(benchmark::State& state) {
   const std::unique_ptr<MetricSource> source = Make();
   std::atomic<std::uint64_t> delivered{0};
-  source->start([&delivered](tarn::service::Metric) { ++delivered; });
+  source->start([&delivered](const tarn::service::Metric&) { ++delivered; });
   Latencies latencies;
   for (auto _ : state) {
     const Clock::time_point asked = Clock::now();
@@ -122,7 +122,7 @@ void BM_StopWhileRunning(benchmark::State& state) {
   for (auto _ : state) {
     state.PauseTiming();
     const std::unique_ptr<MetricSource> source = Make();
-    source->start([&delivered](tarn::service::Metric) { ++delivered; });
+    source->start([&delivered](const tarn::service::Metric&) { ++delivered; });
     std::this_thread::sleep_for(std::chrono::milliseconds(20));
     state.ResumeTiming();
     const Clock::time_point asked = Clock::now();

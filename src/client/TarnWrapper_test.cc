@@ -61,7 +61,8 @@ class RecordingTransport final : public tarn::client::Transport {
  public:
   explicit RecordingTransport(std::shared_ptr<tarn::client::Transport> inner)
       : inner_(std::move(inner)) {}
-  explicit RecordingTransport(std::optional<tarn::CommandResult> answer) : answer_(answer) {}
+  explicit RecordingTransport(std::optional<tarn::CommandResult> answer)
+      : answer_(std::move(answer)) {}
 
   std::unique_ptr<tarn::client::Connection> connect(const std::string& clientName,
                                                     tarn::client::EventSink sink) override {

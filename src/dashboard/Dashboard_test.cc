@@ -36,7 +36,7 @@ class SeriesApiTest : public store::fixtures::StoreTest {
     clock -= 1000;
   }
 
-  ui::web::Site::QueryAnswer ask(ui::web::QueryParameters parameters) {
+  ui::web::Site::QueryAnswer ask(const ui::web::QueryParameters& parameters) {
     return answerSeries(series, parameters);
   }
 

@@ -191,17 +191,17 @@ TEST_F(DetectorsTest, TurnsScriptedMetricsIntoEvents) {
         lteRrc(Lte::KLTE_RRC_STATE_IDLE, Lte::KLTE_RRC_CAUSE_EST_FAIL_REJ)},
        {"info rrc LTE RRC IDLE (KLTE_RRC_CAUSE_NA)",
         "info rrc LTE RRC IDLE → CONNECTED (KLTE_RRC_CAUSE_EST_MO_DATA)",
-        "failure radio-link LTE RRC CONNECTED → ATMPT_CONNECTION: radio link failure, "
-        "re-establishing (KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)",
-        "failure radio-link LTE RRC ATMPT_CONNECTION → IDLE: connection lost "
-        "(KLTE_RRC_CAUSE_REL_CONN_FAIL_T311_EXP)",
+        ("failure radio-link LTE RRC CONNECTED → ATMPT_CONNECTION: radio link failure, "
+         "re-establishing (KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)"),
+        ("failure radio-link LTE RRC ATMPT_CONNECTION → IDLE: connection lost "
+         "(KLTE_RRC_CAUSE_REL_CONN_FAIL_T311_EXP)"),
         "warning rrc LTE RRC IDLE → NULL: no service (KLTE_RRC_CAUSE_NO_SERVICE)",
-        "failure radio-link LTE RRC NULL → ATMPT_CONNECTION: radio link failure, "
-        "re-establishing (KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)",
-        "warning radio-link LTE RRC ATMPT_CONNECTION → CONNECTED: re-established "
-        "(KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)",
-        "failure rrc LTE RRC CONNECTED → IDLE: connection set-up failed "
-        "(KLTE_RRC_CAUSE_EST_FAIL_REJ)"}},
+        ("failure radio-link LTE RRC NULL → ATMPT_CONNECTION: radio link failure, "
+         "re-establishing (KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)"),
+        ("warning radio-link LTE RRC ATMPT_CONNECTION → CONNECTED: re-established "
+         "(KLTE_RRC_CAUSE_REEST_OTHER_FAIL_T310_EXP)"),
+        ("failure rrc LTE RRC CONNECTED → IDLE: connection set-up failed "
+         "(KLTE_RRC_CAUSE_EST_FAIL_REJ)")}},
       {"UMTS states show the cause that applies to them",
        {umtsRrc(Umts::KWCDMA_RRC_CONN_STATE_IDLE, Umts::KRRC_EST_ORIG_CONV_CALL,
                 Umts::KRRC_REL_OTHER_CAUSE),
@@ -220,8 +220,8 @@ TEST_F(DetectorsTest, TurnsScriptedMetricsIntoEvents) {
        {"info rrc UMTS RRC IDLE", "info rrc UMTS RRC IDLE → ESTABLISH (KRRC_EST_ORIG_BACKGND_CALL)",
         "info rrc UMTS RRC ESTABLISH → CELL_DCH",
         "failure radio-link UMTS RRC CELL_DCH → RADIO_LINK_FAILURE: radio link failure",
-        "failure radio-link UMTS RRC RADIO_LINK_FAILURE → IDLE: connection lost "
-        "(KRRC_REL_CONN_REL_LOWER_LAYER_FAILURE_DL)",
+        ("failure radio-link UMTS RRC RADIO_LINK_FAILURE → IDLE: connection lost "
+         "(KRRC_REL_CONN_REL_LOWER_LAYER_FAILURE_DL)"),
         "info rrc UMTS RRC IDLE → CELL_FACH",
         "info rrc UMTS RRC CELL_FACH → IDLE (KRRC_REL_NORMAL_EVENT)"}},
       {"serving cells: handovers when connected, reselections when idle, technology and area",

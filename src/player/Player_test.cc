@@ -32,7 +32,8 @@ Drive numbered(const std::vector<std::int64_t>& times) {
 
 class PlayerPacing : public ::testing::Test {
  protected:
-  Player make(std::vector<std::int64_t> times, std::optional<double> speed, bool loop = false) {
+  Player make(const std::vector<std::int64_t>& times, std::optional<double> speed,
+              bool loop = false) {
     return Player(numbered(times),
                   {[this] {
                      delivered.clear();

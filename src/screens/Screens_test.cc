@@ -244,7 +244,8 @@ TEST(TheMenuTexts, NameACategoryWithDataForEveryItemButTheTwoIdentities) {
   std::size_t keys = 0;
   for (const std::string& launch : items.launchViewItemNames())
     for (const std::string& item : items.firstLevelViewItems().at(launch)) {
-      const std::string key = launch + " " + item;
+      std::string key = launch;
+      key.append(" ").append(item);
       ++keys;
       const bool identity = key == "Device Info IMSI" || key == "Device Info IMEISV";
       EXPECT_EQ(screens::categoryFor(key) == nullptr, identity) << key;

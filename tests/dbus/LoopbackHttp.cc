@@ -5,6 +5,8 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <stdexcept>
+
 namespace bustest {
 
 int freePort() {
@@ -13,8 +15,11 @@ int freePort() {
   address.sin_family = AF_INET;
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
   socklen_t length = sizeof address;
-  ::bind(probe, reinterpret_cast<sockaddr*>(&address), sizeof address);
-  ::getsockname(probe, reinterpret_cast<sockaddr*>(&address), &length);
+  if (probe < 0 || ::bind(probe, reinterpret_cast<sockaddr*>(&address), length) != 0 ||
+      ::getsockname(probe, reinterpret_cast<sockaddr*>(&address), &length) != 0) {
+    if (probe >= 0) ::close(probe);
+    throw std::runtime_error("no free port on the loopback interface");
+  }
   ::close(probe);
   return ntohs(address.sin_port);
 }

@@ -5,7 +5,7 @@
 
 namespace bustest {
 
-// A loopback port that was free a moment ago.
+// A loopback port that was free a moment ago; throws when the system gives none.
 int freePort();
 
 // The body of GET `path` on the loopback port, or empty when no whole answer came within 5 s.

@@ -81,7 +81,7 @@ class AddressPipe {
 
 }  // namespace
 
-PrivateBus::PrivateBus(std::optional<std::filesystem::path> socket) {
+PrivateBus::PrivateBus(const std::optional<std::filesystem::path>& socket) {
   const std::filesystem::path configuration = folder_ / "bus.conf";
   writeConfiguration(configuration, socket.value_or(folder_ / "bus"));
   AddressPipe pipe;

@@ -18,7 +18,7 @@ class PrivateBus {
  public:
   // Listens on `socket`, or on a socket in its own folder. Throws std::runtime_error when the
   // daemon does not start.
-  explicit PrivateBus(std::optional<std::filesystem::path> socket = std::nullopt);
+  explicit PrivateBus(const std::optional<std::filesystem::path>& socket = std::nullopt);
   ~PrivateBus();
   PrivateBus(const PrivateBus&) = delete;
   PrivateBus& operator=(const PrivateBus&) = delete;

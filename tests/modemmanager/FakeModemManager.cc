@@ -114,7 +114,7 @@ void FakeModemManager::publish(const std::string& path,
       const unsigned modem = static_cast<unsigned>(std::stoul(index));
       object->object->registerMethod(
           std::string(mm::kModemInterface), std::string(mm::method::kGetCellInfo), "", "aa{sv}",
-          [this, modem](sdbus::MethodCall call) {
+          [this, modem](const sdbus::MethodCall& call) {
             ++cellInfoCalls_[modem];
             if (refuse_) {
               throw sdbus::Error(std::string(mm::kUnauthorizedError),

@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <mutex>
-#include <ranges>
 #include <utility>
 
 #include "Drive.h"
@@ -49,10 +48,11 @@ class Seen {
   template <class Record>
   std::shared_ptr<Record> last(std::uint32_t metricId) const {
     const std::lock_guard lock(mutex_);
-    for (const auto& metric : std::ranges::reverse_view(metrics_)) {
-      if (metric.metricId == metricId) return Record::initWithData(&metric.payload);
-    }
-    return nullptr;
+    const auto found = std::find_if(metrics_.rbegin(), metrics_.rend(), [&](const auto& metric) {
+      return metric.metricId == metricId;
+    });
+    if (found == metrics_.rend()) return nullptr;
+    return Record::initWithData(&found->payload);
   }
   void clear() {
     const std::lock_guard lock(mutex_);

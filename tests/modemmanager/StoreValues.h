@@ -1,7 +1,8 @@
 #pragma once
 
+#include <algorithm>
+#include <cstddef>
 #include <optional>
-#include <ranges>
 #include <span>
 #include <string_view>
 
@@ -16,13 +17,14 @@ namespace mmtest {
 inline std::optional<platform::Value> valueAt(const store::MetricValidator& store,
                                               std::string_view path) {
   platform::Value value = store::dumpStore(store);
-  for (const auto part : std::views::split(path, '/')) {
+  for (std::size_t start = 0; !path.empty() && start <= path.size();) {
+    const std::size_t slash = std::min(path.find('/', start), path.size());
+    const std::string_view key = path.substr(start, slash - start);
+    start = slash + 1;
     const platform::List* list = value.asList();
     const platform::Value& whole = list != nullptr && !list->empty() ? list->at(0) : value;
     const platform::Dictionary* dictionary = whole.asDictionary();
-    const platform::Value* found =
-        dictionary != nullptr ? dictionary->find(std::string_view(part.begin(), part.end()))
-                              : nullptr;
+    const platform::Value* found = dictionary != nullptr ? dictionary->find(key) : nullptr;
     if (found == nullptr) return std::nullopt;
     value = platform::Value(*found);  // a copy: `found` lies within `value`
   }

@@ -59,7 +59,7 @@ void run(const std::string& command) {
 }  // namespace
 
 TestCertificates makeTestCertificates(const std::filesystem::path& folder) {
-  const TestCertificates files{folder / "ca.pem", folder / "broker.pem", folder / "broker.key"};
+  TestCertificates files{folder / "ca.pem", folder / "broker.pem", folder / "broker.key"};
   const std::string caKey = (folder / "ca.key").string();
   const std::string request = (folder / "broker.csr").string();
   const std::string extensions = (folder / "broker.ext").string();

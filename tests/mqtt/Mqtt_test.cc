@@ -92,8 +92,8 @@ TEST(APublisher, DeliversEachLineByteForByteInOrderAtEitherQualityOfService) {
     ASSERT_TRUE(eventually([&] { return publisher.counts().linked; }));
 
     std::vector<std::string> lines = numberedLines(0, 200);
-    lines.push_back(R"({"device":"Zürich ☎ \"quoted\" \\ back","x":[1,2.5,null]})");
-    lines.push_back(std::string(100'000, 'x'));
+    lines.emplace_back(R"({"device":"Zürich ☎ \"quoted\" \\ back","x":[1,2.5,null]})");
+    lines.emplace_back(100'000, 'x');
     for (const std::string& line : lines)
       publisher.publish(line);
 

@@ -60,7 +60,7 @@ class OverloadTest : public ::testing::Test {
   // The drive's metrics that the shipped configuration subscribes to, as a metric log with
   // their delivery times; written when first asked for.
   static std::filesystem::path drive() {
-    const std::filesystem::path path = file("drive.jsonl");
+    std::filesystem::path path = file("drive.jsonl");
     if (lines_ > 0) return path;
     const auto configuration = tarn::service::Configuration::parse(
         contentsOf(NORVO_RESOURCES_DIR "/fen_test_lte.deviceconfig"));

@@ -106,7 +106,7 @@ TEST(Wireshark, TsharkDecodesAnExportedDriveAsTheIntakeDoes) {
   const std::map<std::string, std::string> fields = fieldPerKind(metrics);
   ASSERT_GE(fields.size(), 28u) << "the drive should show nearly every record kind";
   std::vector<std::string> tshark = {
-      "tshark", "-r",    (folder / "drive.pcapng").string(), "-X", "lua_script:" NORVO_DISSECTOR,
+      "tshark", "-r",    (folder / "drive.pcapng").string(), "-X", ("lua_script:" NORVO_DISSECTOR),
       "-T",     "fields"};
   const auto each = [&tshark](std::string_view flag, std::vector<std::string> values) {
     for (std::string& value : values)
@@ -120,7 +120,9 @@ TEST(Wireshark, TsharkDecodesAnExportedDriveAsTheIntakeDoes) {
   std::vector<std::string> kinds;
   for (const auto& [record, key] : fields) {
     kinds.push_back(record);
-    tshark.insert(tshark.end(), {"-e", "pbf.norvo.metrics." + record + "." + key});
+    std::string field = "pbf.norvo.metrics." + record;
+    field.append(".").append(key);
+    tshark.insert(tshark.end(), {"-e", std::move(field)});
   }
   std::string table = run(folder, tshark);
   if (!table.empty() && table.back() == '\n') table.pop_back();

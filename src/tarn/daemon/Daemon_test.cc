@@ -157,7 +157,7 @@ TEST(DaemonOptions, RefusesArgumentsThatMakeNoSenseAndSaysWhyUnlessAskedForHelp)
     const ParsedOptions parsed = parse(arguments);
     EXPECT_FALSE(parsed.options) << error;
     EXPECT_EQ(parsed.error, error);
-    arguments.push_back("--help");
+    arguments.emplace_back("--help");
     EXPECT_TRUE(parse(arguments).options.value_or(DaemonOptions{}).help) << error;
   }
 }

@@ -39,7 +39,7 @@ class ReplaySourceTest : public ::testing::Test {
   ~ReplaySourceTest() override { std::filesystem::remove_all(directory_); }
 
   std::string writeLog(const std::string& contents) {
-    const std::string path = (directory_ / "metrics.jsonl").string();
+    std::string path = (directory_ / "metrics.jsonl").string();
     std::ofstream(path, std::ios::binary | std::ios::trunc) << contents;
     return path;
   }
@@ -59,7 +59,7 @@ class ReplaySourceTest : public ::testing::Test {
 
   void startRecording(ReplaySource& source) {
     const auto began = clock->now();
-    source.start([this, began](Metric metric) {
+    source.start([this, began](const Metric& metric) {
       const std::lock_guard lock(mutex_);
       delivered_.push_back({metric.metricId, clock->now() - began});
       arrived_.notify_all();

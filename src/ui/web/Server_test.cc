@@ -277,7 +277,7 @@ class ATlsServer : public AServer {
     clientTls.set_verify_mode(ssl::verify_peer);
   }
 
-  Response get(std::string target, std::string cookie = {}) {
+  Response get(const std::string& target, const std::string& cookie = {}) {
     beast::ssl_stream<beast::tcp_stream> stream(client, clientTls);
     stream.set_verify_callback(ssl::host_name_verification("127.0.0.1"));
     beast::get_lowest_layer(stream).connect(endpoint);

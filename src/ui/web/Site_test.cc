@@ -31,8 +31,8 @@ class ASite : public ::testing::Test {
     return (answering != nullptr ? *answering : site).handle(request);
   }
 
-  json::value getJson(std::string target) {
-    const Response response = get(std::move(target));
+  json::value getJson(const std::string& target) {
+    const Response response = get(target);
     EXPECT_EQ(response[http::field::content_type], "application/json");
     return json::parse(response.body());
   }

@@ -14,6 +14,7 @@
 #include <thread>
 
 #include "Eventually.h"
+#include "LoopbackHttp.h"
 
 namespace mqtttest {
 
@@ -27,20 +28,6 @@ sockaddr_in loopback(std::uint16_t port) {
   address.sin_port = htons(port);
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
   return address;
-}
-
-// A port that nothing listens on now; the broker takes it a moment later.
-std::uint16_t freePort() {
-  const int socket = ::socket(AF_INET, SOCK_STREAM, 0);
-  sockaddr_in address = loopback(0);
-  socklen_t length = sizeof address;
-  if (socket < 0 || ::bind(socket, reinterpret_cast<sockaddr*>(&address), length) != 0 ||
-      ::getsockname(socket, reinterpret_cast<sockaddr*>(&address), &length) != 0) {
-    if (socket >= 0) ::close(socket);
-    throw std::runtime_error("no free port on the loopback interface");
-  }
-  ::close(socket);
-  return ntohs(address.sin_port);
 }
 
 bool accepts(std::uint16_t port) {
@@ -78,7 +65,9 @@ TestCertificates makeTestCertificates(const std::filesystem::path& folder) {
 }
 
 Broker::Broker(std::filesystem::path folder, Options options)
-    : folder_(std::move(folder)), options_(std::move(options)), port_(freePort()) {
+    : folder_(std::move(folder)),
+      options_(std::move(options)),
+      port_(static_cast<std::uint16_t>(bustest::freePort())) {
   std::ofstream configuration(folder_ / "mosquitto.conf");
   configuration << "listener " << port_ << " 127.0.0.1\n"
                 << "persistence " << (options_.persistent ? "true" : "false") << "\n"
